@@ -1,0 +1,29 @@
+# Flags and helpers that our targets share. Nothing here leaks to whoever links us.
+
+# Every target of ours: warnings, hidden visibility.
+add_library(velk_flags INTERFACE)
+target_compile_options(velk_flags INTERFACE -Wall -Wextra -Wpedantic -Wshadow
+  $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>
+  -fvisibility=hidden $<$<COMPILE_LANGUAGE:CXX>:-fvisibility-inlines-hidden>
+  $<$<BOOL:${VELK_WARNINGS_ARE_ERRORS}>:-Werror>)
+
+# Targets that know where things live.
+add_library(velk_paths INTERFACE)
+target_compile_definitions(velk_paths INTERFACE
+  VELK_ROOT="${VELK_ROOT}" VELK_SYSTEM_UID=${VELK_SYSTEM_UID} VELK_SYSTEM_GID=${VELK_SYSTEM_GID}
+  VELK_SASLAUTHD_SOCKET="${VELK_SASLAUTHD_SOCKET}")
+
+# velk_platform_library(NAME SOURCES ... [LIBRARIES ...]): one shared library of the platform,
+# which exports what its header under velk/ marks and nothing else.
+function(velk_platform_library name)
+  cmake_parse_arguments(PARSE_ARGV 1 arg "" "" "SOURCES;LIBRARIES")
+  add_library(${name} SHARED ${arg_SOURCES})
+  target_include_directories(${name} PUBLIC
+    $<BUILD_INTERFACE:${PROJECT_SOURCE_DIR}/platform/include>
+    $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+  target_link_libraries(${name} PRIVATE $<BUILD_INTERFACE:velk_flags>
+                        $<BUILD_INTERFACE:velk_paths> ${arg_LIBRARIES})
+  target_link_options(${name} PRIVATE -Wl,--no-undefined -Wl,-z,relro -Wl,-z,now)
+  set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1 INSTALL_RPATH "$ORIGIN")
+  install(TARGETS ${name} EXPORT velksharing-targets LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+endfunction()
