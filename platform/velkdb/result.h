@@ -1,0 +1,44 @@
+#ifndef VELKDB_RESULT_H
+#define VELKDB_RESULT_H
+
+#include <cstddef>
+#include <string>
+#include <string_view>
+#include <vector>
+
+/// The rows of one executed statement, copied out of SQLite.
+///
+/// All texts lie one after the other in one block, each with its terminating zero.
+struct DBResult_tag {
+ public:
+  /// A result without rows.
+  /// @param column_names in the order of the output; equal names may occur.
+  explicit DBResult_tag(const std::vector<std::string> &column_names);
+
+  /// Appends the next value of the row being filled; a row is complete with its last column.
+  void Append(std::string_view value);
+  /// The number of complete rows.
+  std::size_t RowCount() const { return offsets_.size() / width_; }
+
+  /// Moves on to the next row. @return false when no row is left.
+  bool NextRow(unsigned int &row);
+  /// The text of one value; "" for an unknown column or row.
+  const char *Text(unsigned int row, const char *column);
+
+ private:
+  struct Column {
+    std::string name;
+    std::size_t index;  ///< Its place in the row.
+  };
+
+  const Column *FindColumn(const char *name);
+
+  std::size_t width_;
+  std::vector<Column> columns_;  ///< Of equal names only the first.
+  std::string texts_;
+  std::vector<std::size_t> offsets_;  ///< Into texts_, row after row.
+  unsigned int next_row_ = 0;
+  std::size_t likely_column_ = 0;  ///< Into columns_: the one after the last one asked for.
+};
+
+#endif

@@ -1,0 +1,33 @@
+#include "statement.h"
+
+#include <sqlite3.h>
+
+namespace velkdb {
+namespace {
+
+Effect EffectOf(sqlite3_stmt *statement, Effect seen) {
+  if (statement == nullptr || sqlite3_stmt_readonly(statement) != 0) return Effect::kNone;
+  // VACUUM writes, but shows nothing while it is prepared.
+  return seen == Effect::kNone ? Effect::kRows : seen;
+}
+
+}  // namespace
+
+void StatementDeleter::operator()(sqlite3_stmt *statement) const {
+  sqlite3_finalize(statement);
+}
+
+int Prepare(sqlite3 *connection, Durability &durability, const char *sql, Statement &statement,
+            const char *&rest) {
+  sqlite3_stmt *handle = nullptr;
+  const char *tail = nullptr;
+  durability.Watch();
+  const int outcome = sqlite3_prepare_v2(connection, sql, -1, &handle, &tail);
+  if (outcome != SQLITE_OK) return outcome;
+  statement.handle.reset(handle);
+  statement.effect = EffectOf(handle, durability.Watched());
+  rest = tail;
+  return SQLITE_OK;
+}
+
+}  // namespace velkdb
