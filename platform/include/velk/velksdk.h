@@ -81,10 +81,14 @@ VELK_PLATFORM_API void VLIBCSzHashFree(VLIBCSzHash *list);
 /// Counts one failed login from an address, and blocks the address when the count reaches the
 /// limit of VELK_ROOT/etc/autoblock.conf (10 failures within 300 seconds block for 86400).
 ///
-/// Addresses are kept in VELK_ROOT/etc/private/autoblock.db. IPv4 addresses written as IPv6 count
-/// as IPv4, other IPv6 addresses count by their /64, zone ids are ignored. Processes may call at
-/// the same moment; no failure is lost. A new block is logged with address and category.
-/// @param category what the visitor failed at, for the log: letters, digits, '-', '_' and '.'.
+/// Addresses are kept in VELK_ROOT/etc/private/autoblock.db, at most 100,000 of them: beyond, the
+/// oldest that are not blocked are forgotten first. IPv4 addresses written as IPv6 count as IPv4,
+/// other IPv6 addresses count by their /64 ("2001:db8:1:2::/64" names it here, too), zone ids are
+/// ignored. Processes may call at the same moment; no failure is lost. While an address is blocked
+/// its count stands still; after the block it starts again. A new block writes one log line with
+/// address and category.
+/// @param category what the visitor failed at, for the log: 1 to 64 letters, digits, '-', '_' and
+///        '.'; anything else, and null, is logged as "unknown".
 /// @return 0 counted, -1 not an address, or the file is unusable (logged).
 VELK_PLATFORM_API int AutoBlockFailLoginSet(const char *ip, const char *category);
 
@@ -97,9 +101,9 @@ VELK_PLATFORM_API int VELKAutoBlockResetByIP(const char *ip);
 ///         may keep a visitor out: a broken file must not lock everybody out.
 VELK_PLATFORM_API int VELKAutoBlockIsDenied(const char *ip);
 
-/// Blocks an address by hand.
+/// Blocks an address by hand, in place of a block that it has. Writes the same log line.
 /// @param seconds how long from now; 0 = for ever.
-/// @return 0, or -1 as AutoBlockFailLoginSet().
+/// @return 0, or -1 as AutoBlockFailLoginSet() and for a negative number of seconds.
 VELK_PLATFORM_API int VELKAutoBlockAdd(const char *ip, const char *category, long seconds);
 
 /// One address that has failed or is blocked, as VELKAutoBlockList() reports it. The texts are
@@ -108,14 +112,15 @@ typedef struct VELKAutoBlockRecord_tag {
   const char *address;   ///< Printed by the C library; an IPv6 network as "2001:db8:1:2::/64".
   const char *category;  ///< Of the last failure.
   int attempts;          ///< Failures in the current window.
-  long last_failure;     ///< When the last failure was counted.
+  long last_failure;     ///< When the last failure was counted; of a hand-made block, its start.
   int blocked;           ///< 1 when blocked now.
   long blocked_until;    ///< End of the block; 0 = for ever. Meaningful only when blocked.
 } VELKAutoBlockRecord;
 
 /// Hands every remembered address to `visit`, blocked ones first, then by last failure, newest
-/// first, until it returns something other than 0.
-/// @return 0, or -1 when the file is unusable (logged). A missing file is an empty one.
+/// first, until it returns something other than 0. `visit` may call the functions above.
+/// @return 0, or -1 when the file is unusable (logged) or `visit` is null. A missing file is an
+///         empty one.
 VELK_PLATFORM_API int VELKAutoBlockList(int (*visit)(const VELKAutoBlockRecord *record, void *data),
                                         void *data);
 
