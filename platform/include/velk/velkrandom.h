@@ -32,7 +32,8 @@ class VELK_PLATFORM_API VELKRandom : public VELKRandomBase {
   VELKRandom();
   ~VELKRandom() override;
 
-  /// Replaces `out` with `length` bytes drawn uniformly from those of `pool`.
+  /// Replaces `out` with `length` bytes drawn uniformly from those of `pool` (a byte that stands
+  /// there twice is twice as likely). `pool` and `out` may be the same string.
   /// @return false, with `out` empty, when `pool` is empty, holds more than 256 bytes, or the
   ///         kernel gives no random bytes. Throws nothing but std::bad_alloc.
   bool getString(const std::string &pool, unsigned int length, std::string &out);
