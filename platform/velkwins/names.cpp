@@ -1,8 +1,8 @@
 #include <climits>
 #include <cstring>
-#include <exception>
 #include <string>
 
+#include "common/no_throw.h"
 #include "velk/velkwins.h"
 #include "winbind.h"
 
@@ -27,9 +27,5 @@ int CopyOut(const std::string &text, char *out, size_t capacity) {
 
 int VELKWinsUserNameFqdn2Netbios(const char *name, char *out, size_t capacity) {
   if (name == nullptr || out == nullptr) return 0;
-  try {
-    return CopyOut(WithShortDomain(name), out, capacity);
-  } catch (const std::exception &) {
-    return 0;
-  }
+  return velk::NoThrow(0, [&] { return CopyOut(WithShortDomain(name), out, capacity); });
 }
