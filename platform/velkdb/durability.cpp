@@ -17,7 +17,9 @@ bool SameName(const char *a, const char *b) {
   return sqlite3_stricmp(a, b) == 0;
 }
 
-Effect EffectOf(const Durability &durability, int action, const char *table, const char *database) {
+// `first` and `second` are what SQLite tells about the action: the table, for changes of rows.
+Effect EffectOf(const Durability &durability, int action, const char *first, const char *second,
+                const char *database) {
   switch (action) {
     case SQLITE_SELECT:
     case SQLITE_READ:
@@ -26,22 +28,23 @@ Effect EffectOf(const Durability &durability, int action, const char *table, con
     case SQLITE_TRANSACTION:
     case SQLITE_SAVEPOINT:
       return Effect::kNone;
+    case SQLITE_PRAGMA:  // the second is its argument
+      return second == nullptr ? Effect::kNone : Effect::kStructure;
     case SQLITE_INSERT:
     case SQLITE_UPDATE:
-      if (durability.IsRelaxed(database, table)) return Effect::kRelaxedRows;
+      if (durability.IsRelaxed(database, first)) return Effect::kRelaxedRows;
       [[fallthrough]];
     case SQLITE_DELETE:
-      return SameName(table, kListTable) ? Effect::kStructure : Effect::kRows;
+      return SameName(first, kListTable) ? Effect::kStructure : Effect::kRows;
     default:
       return Effect::kStructure;
   }
 }
 
-// SQLite names the database third for everything on which EffectOf() looks at it.
-int OnAction(void *durability, int action, const char *first, const char * /*second*/,
+int OnAction(void *durability, int action, const char *first, const char *second,
              const char *database, const char * /*trigger*/) {
   auto *self = static_cast<Durability *>(durability);
-  self->See(EffectOf(*self, action, first, database));
+  self->See(EffectOf(*self, action, first, second, database));
   return SQLITE_OK;
 }
 

@@ -6,7 +6,9 @@ namespace velkdb {
 namespace {
 
 Effect EffectOf(sqlite3_stmt *statement, Effect seen) {
-  if (statement == nullptr || sqlite3_stmt_readonly(statement) != 0) return Effect::kNone;
+  // SQLite calls a PRAGMA that changes a setting of the connection read-only.
+  if (statement == nullptr || seen == Effect::kStructure) return seen;
+  if (sqlite3_stmt_readonly(statement) != 0) return Effect::kNone;
   // VACUUM writes, but shows nothing while it is prepared.
   return seen == Effect::kNone ? Effect::kRows : seen;
 }

@@ -23,6 +23,15 @@ int Wait(pid_t child) {
   return StatusOf(status);
 }
 
+pid_t Fork(const std::function<int()> &body) {
+  fflush(nullptr);
+  const pid_t child = fork();
+  if (child != 0) return child;
+  const int result = body();
+  fflush(nullptr);
+  _exit(result);
+}
+
 void Redirect(const std::string &path, int flags, int descriptor) {
   const int file = open(path.c_str(), flags, 0600);
   if (file == -1 || dup2(file, descriptor) == -1) _exit(126);
@@ -58,14 +67,16 @@ Outcome RunProgram(const std::vector<std::string> &arguments, const std::string 
 }
 
 int RunForked(const std::function<int()> &body) {
-  fflush(nullptr);
-  const pid_t child = fork();
-  if (child == 0) {
-    const int result = body();
-    fflush(nullptr);
-    _exit(result);
-  }
-  return Wait(child);
+  return Wait(Fork(body));
+}
+
+std::vector<int> RunForkedTogether(int count, const std::function<int(int)> &body) {
+  std::vector<pid_t> children;
+  for (int number = 0; number < count; ++number)
+    children.push_back(Fork([&body, number] { return body(number); }));
+  std::vector<int> statuses;
+  for (const pid_t child : children) statuses.push_back(Wait(child));
+  return statuses;
 }
 
 }  // namespace velk_test

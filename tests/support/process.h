@@ -24,6 +24,11 @@ Outcome RunProgram(const std::vector<std::string> &arguments, const std::string 
 /// @return what `body` returned (0 to 255); 128 + the signal's number when a signal ended it.
 int RunForked(const std::function<int()> &body);
 
+/// Runs `body` in `count` forked copies of this process at the same time and waits for all.
+/// @param body is handed its copy's number, from 0.
+/// @return as RunForked(), for each copy in order.
+std::vector<int> RunForkedTogether(int count, const std::function<int(int)> &body);
+
 }  // namespace velk_test
 
 #endif

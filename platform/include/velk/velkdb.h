@@ -32,13 +32,16 @@ typedef struct DBResult_tag DBResult;          ///< The rows of one executed sta
 /// server and are not read.
 ///
 /// The file is never created, and not followed when its last component is a symbolic link.
-/// The connection waits up to 10 seconds for other processes, distrusts the schema
-/// (defensive mode on, trusted schema off) and runs with `synchronous=NORMAL`.
+/// A file that may only be read is opened for reading. Each statement waits up to 10 seconds in
+/// all for other processes. The connection distrusts the schema (defensive mode on, trusted schema
+/// off) and keeps `synchronous=NORMAL`. An existing WAL is opened here already, as the account that
+/// the process now has. A file that is broken is connected to; its statements fail.
 ///
 /// Durability. In WAL mode a committed change survives the death of the process at once. It has
 /// also reached the disk when VELKDBExecute() returns, unless all that its transaction wrote were
 /// INSERTs and UPDATEs of tables that the file itself lists as relaxed: the rows of its table
-/// `velkdb_relaxed` (`name TEXT PRIMARY KEY`). A file without that table lists nothing.
+/// `velkdb_relaxed` (`name TEXT PRIMARY KEY`). A file without that table lists nothing. The list is
+/// read when the connection is made and again after this connection has changed it.
 ///
 /// @return a handle to be closed with VELKDBClose(), or null: null or empty path, no such file,
 ///         no permission, a symbolic link, no memory.
@@ -51,7 +54,8 @@ VELK_PLATFORM_API VELKDBHandle *VELKDBConnect(const char *host, const char *user
 ///        or null when there is none; to be freed with VELKDBFreeResult(). May be null. Is set to
 ///        null on failure.
 /// @return 0, or -1 (null handle or text, or a statement failed: see VELKDBErrorGet()). A failed
-///         call rolls back a transaction that this same call had opened, and no other.
+///         call rolls back a transaction that this same call had opened, and no other. When only
+///         the flush to the disk failed, the call fails although the change is committed.
 VELK_PLATFORM_API int VELKDBExecute(VELKDBHandle *handle, const char *sql, DBResult **result);
 
 /// The text of this handle's last failure; "" before the first. Never null. Owned by the handle
