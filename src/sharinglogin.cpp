@@ -1,0 +1,332 @@
+#include <array>
+#include <ctime>
+#include <set>
+
+#include "internal/log.h"
+#include "internal/platform_ptr.h"
+#include "record/entry_private.h"
+#include "velksharing/access.h"
+#include "velksharing/constants.h"
+#include "velksharing/store.h"
+#include "velksharing/utils.h"
+
+namespace VELK {
+namespace {
+
+using sharing::UID_ERR;
+using sharing::db::EntryDB;
+using sharing::db::SessionDB;
+using sharing::db::SharingDB;
+using sharing::db::TokenDB;
+using sharing::internal::CgiPtr;
+using sharing::internal::LogErrorWithoutPid;
+using sharing::internal::UserPtr;
+using sharing::record::Entry;
+using sharing::record::EntryPrivate;
+using sharing::record::Session;
+using sharing::record::Token;
+
+constexpr char kSource[] = "sharinglogin";
+constexpr char kBlockCategory[] = "SHARING";
+constexpr long kLifetimeSeconds = 86400;
+constexpr int kDone = 1;
+constexpr int kNotDone = 0;
+
+/// What the check of an account gives. The values are those of VelkSharingAuthResult.
+enum AccountCheck {
+  kPermitted = VELK_SHARING_AUTH_OK,
+  kWrongCredentials = VELK_SHARING_AUTH_REFUSED,
+  kNotCheckable = VELK_SHARING_AUTH_UNUSABLE,
+  kNotPermitted = VELK_SHARING_AUTH_LINK_INVALID
+};
+
+long EndOfLifetime() {
+  return static_cast<long>(time(nullptr)) + kLifetimeSeconds;
+}
+
+bool GetRemoteIP(std::string &ip_out) {
+  std::array<char, 65> buffer{};
+  if (VelkCgiGetRemoteIP(buffer.data(), buffer.size()) == -1) return false;
+  ip_out = buffer.data();
+  return true;
+}
+
+/// Hands the platform's own login session, a parameter of the request, to the platform's login.
+bool TakeOverPlatformSession(VelkCgi *cgi) {
+  const char *platform_session = VelkCgiGetRequestParam(cgi, "_sid", nullptr);
+  if (platform_session == nullptr || *platform_session == '\0') return true;
+  return VelkCgiSetCookies(cgi, "id", platform_session, 0, "/", nullptr, 0) == 1;
+}
+
+bool PlatformLogin(VelkCgi *cgi, const _tag_sharing_login_params *params) {
+  const std::string name = sharing::GetRealUsername(params->username);
+  VelkCgiLoginRecord record = {name.c_str(), params->user_password, "webui", 15, 1};
+  std::array<char, 101> reported_name{};
+  return VelkCgiLogin(cgi, reported_name.data(), reported_name.size(), &record) == 1;
+}
+
+/// Finds the account to check: the one that logs in now or, without a name, the one remembered.
+/// @param uid the remembered account; receives the one that logged in.
+AccountCheck FindAccount(VelkCgi *cgi, const _tag_sharing_login_params *params, unsigned int &uid,
+                         UserPtr &user, std::set<unsigned int> &gids) {
+  VELKUSER *found = nullptr;
+  if (params->username == nullptr) {
+    const int answer = VELKUserGetByUID(uid, &found);
+    user.reset(found);
+    return answer == 0 && sharing::UserGroupsGet(user.get(), gids) ? kPermitted : kNotCheckable;
+  }
+  if (!PlatformLogin(cgi, params)) return kWrongCredentials;
+  const bool known = sharing::UserGet(params->username, found);
+  user.reset(found);
+  if (!known || !sharing::UserGroupsGet(user.get(), gids)) return kNotCheckable;
+  uid = user->uid;
+  return kPermitted;
+}
+
+/// Whether the link permits the account by its stored ids. Names that had no id when they were set
+/// do not count, even if they have one now.
+bool IsPermitted(const EntryPrivate &entry, unsigned int uid, const std::set<unsigned int> &gids) {
+  for (unsigned int permitted : entry.protect_uids_) {
+    if (permitted == uid) return true;
+  }
+  for (unsigned int permitted : entry.protect_gids_) {
+    if (gids.count(permitted) != 0) return true;
+  }
+  return false;
+}
+
+AccountCheck LoginProtectUser(const Entry &entry, const _tag_sharing_login_params *params,
+                              unsigned int &uid_io) {
+  VelkCgi *context = nullptr;
+  const bool has_context = VelkCgiInit(&context, "") == 1;
+  const CgiPtr cgi(context);
+  if (!has_context) return kNotCheckable;
+  VelkCgiLoadInCookies(cgi.get());
+  if (!TakeOverPlatformSession(cgi.get())) return kNotCheckable;
+
+  UserPtr user;
+  std::set<unsigned int> gids;
+  const AccountCheck found = FindAccount(cgi.get(), params, uid_io, user, gids);
+  if (found != kPermitted) return found;
+  const auto &stored = static_cast<const EntryPrivate &>(entry.GetCObject());
+  return IsPermitted(stored, user->uid, gids) ? kPermitted : kNotPermitted;
+}
+
+int RefuseAndCount(const std::string &ip, VelkSharingLoginResult result) {
+  AutoBlockFailLoginSet(ip.c_str(), kBlockCategory);
+  return result;
+}
+
+int CheckPassword(const Entry &entry, const _tag_sharing_login_params *params,
+                  const std::string &ip) {
+  if (params->password == nullptr) return RefuseAndCount(ip, VELK_SHARING_LOGIN_REFUSED);
+  if (entry.IsPasswordValid(params->password)) return VELK_SHARING_LOGIN_OK;
+  return RefuseAndCount(ip, VELK_SHARING_LOGIN_WRONG_PASSWORD);
+}
+
+int CheckAccount(const Entry &entry, const _tag_sharing_login_params *params, bool keep_block_state,
+                 const std::string &ip, unsigned int &uid) {
+  switch (LoginProtectUser(entry, params, uid)) {
+    case kPermitted:
+      return VELK_SHARING_LOGIN_OK;
+    case kNotPermitted:
+      if (keep_block_state) return VELK_SHARING_LOGIN_NOT_PERMITTED;
+      return RefuseAndCount(ip, VELK_SHARING_LOGIN_NOT_PERMITTED);
+    case kWrongCredentials:
+      return RefuseAndCount(ip, VELK_SHARING_LOGIN_ACCOUNT_REFUSED);
+    default:
+      return RefuseAndCount(ip, VELK_SHARING_LOGIN_REFUSED);
+  }
+}
+
+/// Checks what the link asks for.
+/// @param uid receives the account's, when the link asks for one.
+int CheckCredential(const Entry &entry, const _tag_sharing_login_params *params,
+                    bool keep_block_state, const std::string &ip, unsigned int &uid) {
+  switch (entry.get_protect_type()) {
+    case Entry::PROTECT_PASSWORD:
+      return CheckPassword(entry, params, ip);
+    case Entry::PROTECT_USER:
+      return CheckAccount(entry, params, keep_block_state, ip, uid);
+    default:
+      return VELK_SHARING_LOGIN_OK;
+  }
+}
+
+bool IsUsedUp(const Entry &entry) {
+  return entry.get_expire_times() > 0 && entry.get_use_count() >= entry.get_expire_times();
+}
+
+/// Finds the visitor's live session or makes a new one; gives it the visitor's address and a new
+/// lifetime. A found one is written later, with its account.
+bool RenewSession(SessionDB &sessions, const char *session_id, const std::string &ip,
+                  Session &session) {
+  const bool found = session_id != nullptr && sessions.GetBySessionId(session_id, session);
+  session.set_ip(ip);
+  session.set_timeout(EndOfLifetime());
+  return found || sessions.CreateWithSessionId(session);
+}
+
+bool RenewToken(TokenDB &tokens, const Session &session, const Entry &entry, Token &token) {
+  const bool found = tokens.GetBySessionEntry(session, entry, token);
+  token.set_timeout(EndOfLifetime());
+  if (found) return tokens.Update(token);
+  token.set_session_id(session.get_id());
+  token.set_entry_id(entry.get_id());
+  return tokens.Create(token);
+}
+
+/// Gives a visitor whose credential holds a session and a grant on the link.
+bool LetIn(TokenDB &tokens, const Entry &entry, const _tag_sharing_login_params *params,
+           unsigned int uid, Session &session, Token &token) {
+  SharingDB &database = SharingDB::Instance();
+  SessionDB sessions(database);
+  std::string ip;
+  if (!database.IsGood() || !GetRemoteIP(ip)) return false;
+  if (!RenewSession(sessions, params->session_id, ip, session)) return false;
+  if (!RenewToken(tokens, session, entry, token)) return false;
+  if (entry.get_protect_type() == Entry::PROTECT_USER) session.set_uid(uid);
+  return sessions.Update(session);
+}
+
+}  // namespace
+
+int VelkSharingLogin(std::string &session_id_out, const _tag_sharing_login_params *params,
+                     bool keep_block_state) {
+  SharingDB &database = SharingDB::Instance();
+  const EntryDB entries(database);
+  std::string ip;
+  if (!database.IsGood() || params == nullptr || params->hash == nullptr || !GetRemoteIP(ip)) {
+    return VELK_SHARING_LOGIN_UNUSABLE;
+  }
+  if (VelkCgiIsDeniedIP(ip.c_str()) == 1) {
+    LogErrorWithoutPid(kSource, "%s:%d VelkAutoBlockIsDeniedIP %s", ip.c_str());
+    return VELK_SHARING_LOGIN_BLOCKED;
+  }
+
+  Entry entry;
+  if (!entries.GetByHash(params->hash, entry) || !entry.IsValid()) {
+    return VELK_SHARING_LOGIN_REFUSED;
+  }
+  // One stricter than IsValid(): this login would be the use too many, while visitors who are in
+  // may stay.
+  if (IsUsedUp(entry)) return VELK_SHARING_LOGIN_USED_UP;
+
+  unsigned int uid = UID_ERR;
+  const int checked = CheckCredential(entry, params, keep_block_state, ip, uid);
+  if (checked != VELK_SHARING_LOGIN_OK) return checked;
+  if (VelkSharingIncreaseUseCount(params->hash) != kDone) {
+    LogErrorWithoutPid(kSource, "%s:%d update entry use count fail");
+  }
+
+  TokenDB tokens(database);
+  Session session;
+  Token token;
+  if (!LetIn(tokens, entry, params, uid, session, token)) {
+    tokens.Delete(token);
+    return VELK_SHARING_LOGIN_UNUSABLE;
+  }
+  session_id_out = session.get_session_id();
+  if (!keep_block_state) VELKAutoBlockResetByIP(ip.c_str());
+  return VELK_SHARING_LOGIN_OK;
+}
+
+namespace {
+
+/// Logs why a visitor is not authorised.
+int NotAuthorized(sharing::internal::Origin origin, const char *format, int result) {
+  LogErrorWithoutPid(origin, format);
+  return result;
+}
+
+}  // namespace
+
+int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
+  SharingDB &database = SharingDB::Instance();
+  SessionDB sessions(database);
+  TokenDB tokens(database);
+  const EntryDB entries(database);
+  Session session;
+  Token token;
+  Entry entry;
+  std::string ip;
+
+  if (!database.IsGood()) {
+    return NotAuthorized(kSource, "%s:%d db is not good", VELK_SHARING_AUTH_UNUSABLE);
+  }
+  if (params == nullptr || params->session_id == nullptr || params->hash == nullptr) {
+    return VELK_SHARING_AUTH_UNUSABLE;
+  }
+  if (!GetRemoteIP(ip)) {
+    return NotAuthorized(kSource, "%s:%d invalid ip", VELK_SHARING_AUTH_UNUSABLE);
+  }
+
+  if (!sessions.GetBySessionId(params->session_id, session)) return VELK_SHARING_AUTH_NO_SESSION;
+  if (!entries.GetByHash(params->hash, entry)) return VELK_SHARING_AUTH_NO_GRANT;
+  if (!tokens.GetBySessionEntry(session, entry, token)) return VELK_SHARING_AUTH_NO_GRANT;
+
+  if (!entry.IsValid()) {
+    return NotAuthorized(kSource, "%s:%d entry is not valid", VELK_SHARING_AUTH_LINK_INVALID);
+  }
+  if (!session.IsLegal()) {
+    return NotAuthorized(kSource, "%s:%d session is not valid", VELK_SHARING_AUTH_LAPSED);
+  }
+  if (!token.IsLegal()) {
+    LogErrorWithoutPid(kSource, "%s:%d token is not valid");
+    if (tokens.Delete(token)) return VELK_SHARING_AUTH_LAPSED;
+    return NotAuthorized(kSource, "%s:%d delete token failed", VELK_SHARING_AUTH_UNUSABLE);
+  }
+
+  if (entry.get_protect_type() == Entry::PROTECT_USER) {
+    unsigned int uid = session.get_uid();
+    const int checked = LoginProtectUser(entry, params, uid);
+    if (checked != kPermitted) return NotAuthorized(kSource, "%s:%d user login error", checked);
+  }
+  if (entry.get_enable_match_ip() && ip != session.get_ip()) {
+    LogErrorWithoutPid(kSource, "%s:%d ip not match, %s, %s", ip.c_str(), session.get_ip().c_str());
+    return VELK_SHARING_AUTH_REFUSED;
+  }
+
+  session.set_timeout(EndOfLifetime());
+  if (!sessions.Update(session)) {
+    return NotAuthorized(kSource, "%s:%d update session failed", VELK_SHARING_AUTH_UNUSABLE);
+  }
+  token.set_timeout(EndOfLifetime());
+  if (!tokens.Update(token)) {
+    return NotAuthorized(kSource, "%s:%d update token failed", VELK_SHARING_AUTH_UNUSABLE);
+  }
+  return VELK_SHARING_AUTH_OK;
+}
+
+int VelkSharingLogout(const std::string &hash, const std::string &session_id) {
+  SharingDB &database = SharingDB::Instance();
+  const EntryDB entries(database);
+  const SessionDB sessions(database);
+  TokenDB tokens(database);
+  Entry entry;
+  Session session;
+  Token token;
+
+  if (!database.IsGood()) return kNotDone;
+  if (!sessions.GetBySessionId(session_id, session)) {
+    return NotAuthorized(kSource, "%s:%d get session failed", kNotDone);
+  }
+  if (!entries.GetByHash(hash, entry)) {
+    return NotAuthorized(kSource, "%s:%d get entry failed", kNotDone);
+  }
+  if (!tokens.GetBySessionEntry(session, entry, token)) {
+    return NotAuthorized(kSource, "%s:%d get token failed", kNotDone);
+  }
+  return tokens.Delete(token) ? kDone : kNotDone;
+}
+
+int VelkSharingIncreaseUseCount(const std::string &hash) {
+  SharingDB &database = SharingDB::Instance();
+  EntryDB entries(database);
+  Entry entry;
+  if (!database.IsGood() || !entries.GetByHash(hash, entry)) return kNotDone;
+  entry.inc_use_count();
+  return entries.Update(entry) ? kDone : kNotDone;
+}
+
+}  // namespace VELK

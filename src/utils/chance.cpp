@@ -1,0 +1,22 @@
+#include <algorithm>
+#include <system_error>
+
+#include "velk/velkrandom.h"
+#include "velksharing/utils.h"
+
+namespace VELK {
+namespace sharing {
+
+bool IsProbabilityHit(float probability) {
+  static RANDOM::VELKRandomBase source;
+  if (!(probability > 0.0f)) return false;  // not a number included
+  const int threshold = static_cast<int>(std::min(probability, 1.0f) * 100.0f);
+  try {
+    return source.random(0, 99) < threshold;
+  } catch (const std::system_error &) {  // no randomness: the work can wait for another call
+    return false;
+  }
+}
+
+}  // namespace sharing
+}  // namespace VELK
