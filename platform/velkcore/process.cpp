@@ -6,10 +6,9 @@
 #include <cerrno>
 #include <memory>
 #include <mutex>
-#include <new>
 #include <string_view>
-#include <system_error>
 #include <unordered_map>
+#include <utility>
 
 #include "descriptor.h"
 #include "velk/velkcore.h"
@@ -18,8 +17,13 @@ namespace {
 
 using velkcore::Descriptor;
 
+/// An error number on its way to errno.
+struct Failure {
+  int error;
+};
+
 void Require(int error) {
-  if (error != 0) throw std::system_error(error, std::generic_category());
+  if (error != 0) throw Failure{error};
 }
 
 void RequireCall(bool succeeded) {
@@ -220,10 +224,10 @@ FILE *VLIBCPopenv(const char *path, const char *mode, const char *const argv[]) 
   }
   try {
     return Open(path, mode, argv);
-  } catch (const std::system_error &error) {
-    errno = error.code().value();
-  } catch (const std::bad_alloc &) {
-    errno = ENOMEM;
+  } catch (const Failure &failure) {
+    errno = failure.error;
+  } catch (...) {
+    errno = ENOMEM;  // what else the standard library throws
   }
   return nullptr;
 }
