@@ -104,14 +104,15 @@ const char *ShownRedirectType(Entry::RedirectType type) {
 
 }  // namespace
 
-// clang-format off: the text of each condition is what the log shows, to the blank
+// The text of each condition is what the log shows, to the blank.
+// clang-format off
 bool EntryPrivate::IsLegal() const {
   VELK_REFUSE_IF(kSource, !blValid_);
   VELK_REFUSE_IF(kSource, "" == hash_);
   VELK_REFUSE_IF(kSource, "" == project_name_);
   VELK_REFUSE_IF(kSource, UID_ERR == owner_uid_);
-  VELK_REFUSE_IF(kSource, !app_.isObject());
-  VELK_REFUSE_IF(kSource, !private_data_.isObject());
+  VELK_REFUSE_IF(kSource, ! app_.isObject());
+  VELK_REFUSE_IF(kSource, ! private_data_.isObject());
   VELK_REFUSE_IF(kSource, Entry::PROTECT_PASSWORD == protect_type_ && "" == protect_password_);
   VELK_REFUSE_IF(kSource, Entry::PROTECT_PASSWORD == protect_type_ &&
                               Entry::ENCRYPT_ALGO_DEFAULT == protect_password_algo_ &&
@@ -124,8 +125,8 @@ bool EntryPrivate::IsLegal() const {
 
 bool EntryPrivate::IsValid() const {
   const time_t timeNow = time(NULL);
-  VELK_REFUSE_IF(kSource, !IsLegal());
-  VELK_REFUSE_IF(kSource, !enabled_);
+  VELK_REFUSE_IF(kSource, ! IsLegal());
+  VELK_REFUSE_IF(kSource, ! enabled_);
   VELK_REFUSE_IF(kSource, 0 < start_at_ && start_at_ > timeNow);
   VELK_REFUSE_IF(kSource, 0 < expire_at_ && timeNow > expire_at_);
   VELK_REFUSE_IF(kSource, 0 < expire_times_ && use_count_ > expire_times_);
