@@ -4,6 +4,7 @@
 #include <sqlite3.h>
 
 #include <filesystem>
+#include <memory>
 #include <string>
 
 #include "support/raw_database.h"
@@ -26,9 +27,9 @@ int CountFlush(sqlite3_file *file, int flags) {
   return disk_is_broken ? SQLITE_IOERR_FSYNC : log_methods->xSync(file, flags);
 }
 
-int OpenCounted(sqlite3_vfs *vfs, const char *name, sqlite3_file *file, int flags, int *out_flags) {
-  auto *system = static_cast<sqlite3_vfs *>(sqlite3_vfs_find("unix"));
-  (void)vfs;
+int OpenCounted(sqlite3_vfs * /*vfs*/, const char *name, sqlite3_file *file, int flags,
+                int *out_flags) {
+  sqlite3_vfs *system = sqlite3_vfs_find("unix");
   const int outcome = system->xOpen(system, name, file, flags, out_flags);
   if (outcome != SQLITE_OK || (flags & SQLITE_OPEN_WAL) == 0) return outcome;
   log_methods = file->pMethods;

@@ -6,6 +6,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <stdexcept>
 
 #include "support/temp_dir.h"
 
@@ -71,9 +72,20 @@ int RunForked(const std::function<int()> &body) {
 }
 
 std::vector<int> RunForkedTogether(int count, const std::function<int(int)> &body) {
+  int gate[2];  // reading from it ends when the last writing end is closed: ours
+  if (pipe(gate) != 0) throw std::runtime_error("pipe failed");
   std::vector<pid_t> children;
-  for (int number = 0; number < count; ++number)
-    children.push_back(Fork([&body, number] { return body(number); }));
+  for (int number = 0; number < count; ++number) {
+    children.push_back(Fork([&body, &gate, number] {
+      char nothing;
+      close(gate[1]);
+      if (read(gate[0], &nothing, 1) != 0) return 255;
+      close(gate[0]);
+      return body(number);
+    }));
+  }
+  close(gate[0]);
+  close(gate[1]);
   std::vector<int> statuses;
   for (const pid_t child : children) statuses.push_back(Wait(child));
   return statuses;

@@ -86,7 +86,7 @@ VELK_PLATFORM_API void VELKDBClose(VELKDBHandle *handle);
 /// @param out receives at most `capacity` bytes, and a terminating zero behind them when there is
 ///        room left for one. `capacity` = 2 × `length` always suffices for the text.
 /// @return the number of bytes written without the terminator, or -1: the text does not fit, a
-///         null pointer with a non-zero length, a length over INT_MAX.
+///         null pointer with a non-zero length, a result over INT_MAX.
 VELK_PLATFORM_API int VELKDBEscapeStringEX2(int engine, char *out, size_t capacity, const char *in,
                                             size_t length);
 
