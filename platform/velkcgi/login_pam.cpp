@@ -46,6 +46,10 @@ int Converse(int count, const pam_message **messages, pam_response **replies, vo
     DropReplies(answers, count);
     return PAM_CONV_ERR;
   }
+  if (replies == nullptr) {  // a module that only tells something may not care for an answer
+    DropReplies(answers, count);
+    return PAM_SUCCESS;
+  }
   *replies = answers;
   return PAM_SUCCESS;
 }

@@ -21,7 +21,8 @@ auto LookUp(const Lookup &lookup, const Keep &keep) -> std::optional<decltype(ke
   for (;;) {
     Record record{};
     Record *found = nullptr;
-    const int error = lookup(&record, buffer.data(), buffer.size(), &found);
+    const int outcome = lookup(&record, buffer.data(), buffer.size(), &found);
+    const int error = outcome == -1 ? errno : outcome;  // wrapped name services may say it so
     if (error == EINTR) continue;
     if (error == ERANGE && buffer.size() < kLargestBufferSize) {
       buffer.resize(buffer.size() * 2);

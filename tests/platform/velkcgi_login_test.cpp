@@ -1,0 +1,288 @@
+// The login of an account through saslauthd's socket, with a server that is told what to answer.
+#include <fcntl.h>
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/socket.h>
+#include <sys/time.h>
+#include <sys/un.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <functional>
+#include <string>
+#include <thread>
+
+#include "support/log_capture.h"
+#include "velk/velkcgi.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+using velk_test::LogCapture;
+
+const fs::path kSocket = VELK_SASLAUTHD_SOCKET;
+
+std::string Field(const std::string &text) {
+  return std::string{static_cast<char>(text.size() >> 8), static_cast<char>(text.size() & 0xff)} +
+         text;
+}
+
+std::string ReadAll(int connection, size_t length) {
+  std::string bytes(length, '\0');
+  size_t have = 0;
+  while (have < length) {
+    const ssize_t count = recv(connection, bytes.data() + have, length - have, 0);
+    if (count <= 0) break;
+    have += static_cast<size_t>(count);
+  }
+  bytes.resize(have);
+  return bytes;
+}
+
+std::string ReadField(int connection) {
+  const std::string length = ReadAll(connection, 2);
+  if (length.size() < 2) return "(cut short)";
+  return ReadAll(connection, static_cast<size_t>(static_cast<unsigned char>(length[0])) << 8 |
+                                 static_cast<unsigned char>(length[1]));
+}
+
+/// Listens where saslauthd would, and lets `serve` answer each caller.
+class Server {
+ public:
+  explicit Server(std::function<void(int)> serve) {
+    fs::create_directories(kSocket.parent_path());
+    fs::remove(kSocket);
+    listener_ = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    strncpy(address.sun_path, kSocket.c_str(), sizeof(address.sun_path) - 1);
+    EXPECT_EQ(0, bind(listener_, reinterpret_cast<sockaddr *>(&address), sizeof(address)));
+    EXPECT_EQ(0, listen(listener_, 8));
+    thread_ = std::thread([this, serve] {
+      int connection;
+      while ((connection = accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC)) != -1) {
+        serve(connection);
+        close(connection);
+      }
+    });
+  }
+  ~Server() {
+    shutdown(listener_, SHUT_RDWR);
+    thread_.join();
+    close(listener_);
+    fs::remove(kSocket);
+  }
+
+ private:
+  int listener_;
+  std::thread thread_;
+};
+
+/// Reads the four fields of a request, then sends `bytes`.
+std::function<void(int)> AnswerWith(const std::string &bytes) {
+  return [bytes](int connection) {
+    for (int i = 0; i < 4; ++i) ReadField(connection);
+    send(connection, bytes.data(), bytes.size(), MSG_NOSIGNAL);
+  };
+}
+
+int Login(const char *name, const char *password, char *out = nullptr, size_t capacity = 0) {
+  VelkCgi *view = nullptr;
+  VelkCgiInit(&view, "");
+  VelkCgiLoginRecord record = {name, password, "webui", 15, 1};
+  const int outcome = VelkCgiLogin(view, out, capacity, &record);
+  VelkCgiFree(view);
+  return outcome;
+}
+
+std::string LogPrefix() {
+  return "saslauthd at " + kSocket.string() + ": ";
+}
+
+TEST(VelkCgiLogin, AsksForTheAccountInTheServiceVelk) {
+  std::vector<std::string> request;
+  {
+    const Server server([&](int connection) {
+      for (int i = 0; i < 4; ++i) request.push_back(ReadField(connection));
+      const std::string yes = Field("OK");
+      send(connection, yes.data(), yes.size(), MSG_NOSIGNAL);
+    });
+    EXPECT_EQ(1, Login("alice", "s3cret \xc3\xa4%"));
+  }
+  EXPECT_THAT(request, ElementsAre("alice", "s3cret \xc3\xa4%", "velk", ""));
+}
+
+TEST(VelkCgiLogin, GivesTheNameOnSuccess) {
+  const Server server(AnswerWith(Field("OK success")));
+  char out[101] = "";
+  EXPECT_EQ(1, Login("alice", "secret", out, sizeof(out)));
+  EXPECT_STREQ("alice", out);
+}
+
+TEST(VelkCgiLogin, FailsWhenTheNameDoesNotFit) {
+  const Server server(AnswerWith(Field("OK")));
+  char out[6] = "xxxxx";
+  EXPECT_EQ(0, Login("alice", "secret", out, 5));
+  EXPECT_EQ(0, Login("alice", "secret", out, 0));
+  EXPECT_EQ(0, Login("alice", "secret", nullptr, 6));
+  EXPECT_STREQ("xxxxx", out);
+  EXPECT_EQ(1, Login("alice", "secret", out, 6));
+  EXPECT_STREQ("alice", out);
+}
+
+TEST(VelkCgiLogin, ARefusalIsFinalAndNoErrorOfTheSystem) {
+  LogCapture log;
+  const Server server(AnswerWith(Field("NO authentication failed")));
+  char out[101] = "before";
+  EXPECT_EQ(0, Login("alice", "wrong", out, sizeof(out)));
+  EXPECT_STREQ("before", out);
+  EXPECT_THAT(log.lines(), IsEmpty());
+}
+
+TEST(VelkCgiLogin, RefusesAnAnswerThatIsNeitherYesNorNo) {
+  for (const std::string &answer : {Field("ok"), Field("O"), Field(""), Field("\xff\xff\xff"),
+                                    Field(" OK"), Field(std::string(65535, 'x'))}) {
+    LogCapture log;
+    const Server server(AnswerWith(answer));
+    EXPECT_EQ(0, Login("alice", "secret"));
+    EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "an answer that is neither yes nor no"));
+  }
+}
+
+TEST(VelkCgiLogin, RefusesAnAnswerThatIsCutShort) {
+  for (const std::string &answer :
+       {std::string(), std::string("\0", 1), std::string("\0\x02", 2), std::string("\0\x02O", 3),
+        std::string("\0\x0aOK", 4), std::string("\xff\xffOK", 4)}) {
+    LogCapture log;
+    const Server server(AnswerWith(answer));
+    EXPECT_EQ(0, Login("alice", "secret"));
+    EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "Connection reset by peer"));
+    EXPECT_EQ(LOG_ERR, log.lines().at(0).priority);
+  }
+}
+
+TEST(VelkCgiLogin, AcceptsAnAnswerThatComesByteByByte) {
+  const Server server([](int connection) {
+    for (int i = 0; i < 4; ++i) ReadField(connection);
+    for (const char byte : Field("OK success")) {
+      send(connection, &byte, 1, MSG_NOSIGNAL);
+      usleep(2000);
+    }
+  });
+  EXPECT_EQ(1, Login("alice", "secret"));
+}
+
+TEST(VelkCgiLogin, SurvivesAServerThatHangsUp) {
+  LogCapture log;
+  const Server server([](int) {});
+  for (int i = 0; i < 100; ++i) EXPECT_EQ(0, Login("alice", "secret"));
+  EXPECT_EQ(100U, log.lines().size());
+}
+
+TEST(VelkCgiLogin, SurvivesInterruptions) {
+  struct sigaction before {};
+  struct sigaction ignore {};
+  ignore.sa_handler = [](int) {};  // without SA_RESTART
+  sigaction(SIGALRM, &ignore, &before);
+  {
+    const Server server([](int connection) {
+      sigset_t all;
+      sigfillset(&all);
+      pthread_sigmask(SIG_BLOCK, &all, nullptr);
+      usleep(50000);
+      AnswerWith(Field("OK"))(connection);
+    });
+    const itimerval often{{0, 1000}, {0, 1000}};
+    const itimerval never{};
+    setitimer(ITIMER_REAL, &often, nullptr);
+    EXPECT_EQ(1, Login("alice", "secret"));
+    setitimer(ITIMER_REAL, &never, nullptr);
+  }
+  sigaction(SIGALRM, &before, nullptr);
+}
+
+TEST(VelkCgiLogin, DoesNotWaitForEverForAServerThatSaysNothing) {
+  LogCapture log;
+  const Server server([](int connection) {
+    char rest[4096];
+    while (recv(connection, rest, sizeof(rest), 0) > 0) {
+    }
+  });
+  const auto start = std::chrono::steady_clock::now();
+  EXPECT_EQ(0, Login("alice", "secret"));
+  const auto waited = std::chrono::steady_clock::now() - start;
+  EXPECT_GE(waited, std::chrono::seconds(9));
+  EXPECT_LE(waited, std::chrono::seconds(15));
+  EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "no answer in time"));
+}
+
+TEST(VelkCgiLogin, KeepsItsSocketFromOtherPrograms) {
+  int sockets = 0;
+  {
+    const Server server([&](int connection) {
+      for (int file = 3; file < 256; ++file) {
+        int type;
+        socklen_t size = sizeof(type);
+        if (getsockopt(file, SOL_SOCKET, SO_TYPE, &type, &size) != 0) continue;
+        ++sockets;
+        EXPECT_TRUE(fcntl(file, F_GETFD) & FD_CLOEXEC) << file;
+      }
+      AnswerWith(Field("OK"))(connection);
+    });
+    EXPECT_EQ(1, Login("alice", "secret"));
+  }
+  EXPECT_GE(sockets, 3) << "listener, both ends";
+}
+
+TEST(VelkCgiLogin, LeavesNoDescriptorBehind) {
+  const Server server(AnswerWith(Field("NO")));
+  const auto count = [] {
+    const auto files = fs::directory_iterator("/proc/self/fd");
+    return std::distance(begin(files), end(files));
+  };
+  Login("alice", "secret");
+  usleep(50000);  // the server's end closes a little later
+  const auto before = count();
+  for (int i = 0; i < 20; ++i) Login("alice", "secret");
+  usleep(50000);
+  EXPECT_EQ(before, count());
+}
+
+TEST(VelkCgiLogin, AsksNobodyAboutNamesAndPasswordsThatCannotBe) {
+  int asked = 0;
+  const std::string long_one(257, 'x');
+  {
+    const Server server([&](int connection) {
+      ++asked;
+      AnswerWith(Field("OK"))(connection);
+    });
+    for (const char *bad : {static_cast<const char *>(nullptr), "", "a\nb", "a\tb", "a\x7f", "\x1b",
+                            long_one.c_str()}) {
+      EXPECT_EQ(0, Login(bad, "secret"));
+      EXPECT_EQ(0, Login("alice", bad));
+    }
+    EXPECT_EQ(0, asked);
+    EXPECT_EQ(1, Login(long_one.c_str() + 1, long_one.c_str() + 1)) << "256 bytes are allowed";
+  }
+  EXPECT_EQ(1, asked);
+}
+
+TEST(VelkCgiLogin, RefusesANullViewAndANullRecord) {
+  const Server server(AnswerWith(Field("OK")));
+  VelkCgiLoginRecord record = {"alice", "secret", "webui", 15, 1};
+  EXPECT_EQ(0, VelkCgiLogin(nullptr, nullptr, 0, &record));
+  VelkCgi *view = nullptr;
+  VelkCgiInit(&view, "");
+  EXPECT_EQ(0, VelkCgiLogin(view, nullptr, 0, nullptr));
+  EXPECT_EQ(1, VelkCgiLogin(view, nullptr, 0, &record));
+  VelkCgiFree(view);
+}
+
+}  // namespace
