@@ -1,0 +1,307 @@
+#include <unistd.h>
+
+#include <memory>
+
+#include "command.h"
+#include "link_options.h"
+#include "operations/accounts.h"
+#include "operations/address.h"
+#include "operations/json_document.h"
+#include "operations/json_form.h"
+#include "operations/links.h"
+#include "operations/moment.h"
+#include "operations/permissions.h"
+#include "operations/verdict.h"
+#include "output.h"
+#include "session_option.h"
+
+namespace command_line {
+namespace {
+
+using namespace operations;
+
+std::string Joined(const std::vector<std::string> &names) {
+  std::string text;
+  for (const std::string &name : names) text += (text.empty() ? "" : ", ") + name;
+  return text;
+}
+
+std::string UsesText(const Entry &link) {
+  const std::string count = std::to_string(link.get_use_count());
+  if (link.get_expire_times() <= 0) return count;
+  return count + " of " + std::to_string(link.get_expire_times());
+}
+
+std::string LimitText(long moment, const char *unset) {
+  return moment > 0 ? MomentText(moment) : unset;
+}
+
+const char *YesNo(bool yes) {
+  return yes ? "yes" : "no";
+}
+
+void PrintLink(const Entry &link) {
+  const Permissions permissions = StoredPermissions(link);
+  PrintDetails({
+      {"hash", link.get_hash()},
+      {"id", std::to_string(link.get_id())},
+      {"state", LinkStateName(StateOf(link, Now()))},
+      {"project", link.get_project_name()},
+      {"owner", AccountText(link.get_owner_uid())},
+      {"protection", ProtectTypeName(link.get_protect_type())},
+      {"title", link.get_protect_title()},
+      {"accounts", Joined(link.get_protect_users())},
+      {"groups", Joined(link.get_protect_groups())},
+      {"never counted", Joined(permissions.unknown_users) +
+                            (permissions.unknown_users.empty() ? "" : " ") +
+                            Joined(permissions.unknown_groups)},
+      {"starts", LimitText(link.get_start_at(), "at once")},
+      {"expires", LimitText(link.get_expire_at(), "never")},
+      {"uses", UsesText(link)},
+      {"address bound", YesNo(link.get_enable_match_ip())},
+      {"removed when expired", YesNo(link.get_auto_gc())},
+      {"redirect", RedirectTypeName(link.get_redirect_type())},
+      {"redirect target", link.get_redirect_uri()},
+      {"app", JsonLine(link.get_app())},
+      {"private data", JsonLine(link.get_private_data())},
+  });
+}
+
+ExitStatus Create(const LinkOptions &options, const Request &request) {
+  LinkChange change = options.ToChange();
+  if (!change.owner_uid) change.owner_uid = getuid();
+  const Entry link = CreateLink(SharingDatabase(), change);
+  if (request.json)
+    PrintJson(ToJson(link));
+  else
+    PrintLine(link.get_hash());
+  return EXIT_DONE;
+}
+
+void AddCreate(CLI::App &group, Request &request) {
+  auto options = std::make_shared<LinkOptions>();
+  CLI::App *command =
+      AddCommand(group, request, "create", "Make a link and print its hash",
+                 "link create --project files --path /srv/photos --password --expire +7d --uses 5",
+                 [options, &request] { return Create(*options, request); });
+  options->AddTo(*command);
+  options->project()->required();
+}
+
+ExitStatus Change(const std::string &hash, const LinkOptions &options, const Request &request) {
+  const LinkChange change = options.ToChange();
+  const Entry link = ChangeLink(SharingDatabase(), hash, change);
+  if (request.json)
+    PrintJson(ToJson(link));
+  else
+    PrintLink(link);
+  return EXIT_DONE;
+}
+
+void AddSet(CLI::App &group, Request &request) {
+  auto hash = std::make_shared<std::string>();
+  auto options = std::make_shared<LinkOptions>();
+  CLI::App *command =
+      AddCommand(group, request, "set", "Change a link; what is not named stays as it is",
+                 "link set aB3xK9pQ2 --expire never --uses 10",
+                 [hash, options, &request] { return Change(*hash, *options, request); });
+  command->add_option("HASH", *hash, "The link")->required();
+  options->AddTo(*command);
+  options->AddClearingTo(*command);
+}
+
+ExitStatus Show(const std::string &hash, const Request &request) {
+  const Entry link = FindLink(SharingDatabase(), hash);
+  if (request.json)
+    PrintJson(ToJson(link));
+  else
+    PrintLink(link);
+  return EXIT_DONE;
+}
+
+void AddShow(CLI::App &group, Request &request) {
+  auto hash = std::make_shared<std::string>();
+  CLI::App *command =
+      AddCommand(group, request, "show", "Show all that is known of a link", "link show aB3xK9pQ2",
+                 [hash, &request] { return Show(*hash, request); });
+  command->add_option("HASH", *hash, "The link")->required();
+}
+
+struct ListOptions {
+  std::string project, owner, state;
+  LinkOrder order = BY_ID;
+  bool descending = false;
+  PageOptions page;
+};
+
+const std::map<std::string, LinkOrder> ORDERS = {
+    {"id", BY_ID},
+    {"hash", BY_HASH},
+    {"project", BY_PROJECT},
+    {"owner", BY_OWNER},
+    {"start", BY_START},
+    {"expire", BY_EXPIRY},
+    {"uses", BY_USES_ALLOWED},
+    {"use-count", BY_USE_COUNT},
+};
+
+LinkQuery ToQuery(const ListOptions &options) {
+  LinkQuery query;
+  if (!options.project.empty()) query.project = options.project;
+  if (!options.owner.empty()) query.owner_uid = ResolveAccount(options.owner);
+  query.state = LinkStateFromName(options.state);
+  query.order = options.order;
+  query.descending = options.descending;
+  query.page = options.page.ToPage();
+  return query;
+}
+
+void PrintLinks(const LinkList &list) {
+  const long now = Now();
+  Table table({"HASH", "PROJECT", "OWNER", "PROTECTION", "STATE", "EXPIRES", "USES", "TITLE"});
+  for (const Entry &link : list.links)
+    table.AddRow({link.get_hash(), link.get_project_name(), AccountText(link.get_owner_uid()),
+                  ProtectTypeName(link.get_protect_type()), LinkStateName(StateOf(link, now)),
+                  LimitText(link.get_expire_at(), "never"), UsesText(link),
+                  link.get_protect_title()});
+  table.Print();
+  PrintLine(std::to_string(list.links.size()) + " of " + Counted(list.total, "link"));
+}
+
+ExitStatus List(const ListOptions &options, const Request &request) {
+  const LinkQuery query = ToQuery(options);
+  const LinkList list = ListLinks(SharingDatabase(), query);
+  if (request.json)
+    PrintJson(ToJson(list, query.page));
+  else
+    PrintLinks(list);
+  if (list.damaged != 0)
+    PrintError(Counted(list.damaged, "link") +
+               " of this page cannot be loaded; “velksharing db check” names them");
+  return EXIT_DONE;
+}
+
+void AddList(CLI::App &group, Request &request) {
+  auto options = std::make_shared<ListOptions>();
+  CLI::App *command =
+      AddCommand(group, request, "list", "List links", "link list --state expired --sort expire",
+                 [options, &request] { return List(*options, request); });
+  command->add_option("--project", options->project, "Only this application's");
+  command->add_option("--owner", options->owner, "Only this account's")->type_name("USER");
+  command->add_option("--state", options->state, "Only links in this state")
+      ->check(CLI::IsMember({"active", "pending", "used-up", "expired", "disabled"}));
+  command->add_option("--sort", options->order, "Order by this field; id when not given")
+      ->type_name("FIELD")
+      ->transform(CLI::Transformer(ORDERS))
+      ->check(CLI::IsMember(ORDERS));
+  command->add_flag("--desc", options->descending, "Largest first");
+  options->page.AddTo(*command);
+}
+
+ExitStatus Enable(const std::vector<std::string> &hashes, bool enabled) {
+  LinkChange change;
+  change.enabled = enabled;
+  SharingDB &db = SharingDatabase();
+  return ForEach(hashes, [&](const std::string &hash) {
+    ChangeLink(db, hash, change);
+    PrintLine(hash + (enabled ? " enabled" : " disabled"));
+  });
+}
+
+ExitStatus Delete(const std::vector<std::string> &hashes) {
+  SharingDB &db = SharingDatabase();
+  return ForEach(hashes, [&](const std::string &hash) {
+    const int grants = DeleteLink(db, hash);
+    PrintLine(hash + " deleted" + (grants == 0 ? "" : " with " + Counted(grants, "grant")));
+  });
+}
+
+void AddForHashes(CLI::App &group, Request &request, const std::string &name,
+                  const std::string &description,
+                  std::function<ExitStatus(const std::vector<std::string> &)> action) {
+  auto hashes = std::make_shared<std::vector<std::string>>();
+  CLI::App *command = AddCommand(group, request, name, description, "link " + name + " aB3xK9pQ2",
+                                 [hashes, action] { return action(*hashes); });
+  command->add_option("HASH", *hashes, "The links")->required();
+}
+
+struct PurgeOptions {
+  std::string owner, project;
+  bool automatic = false;
+};
+
+ExitStatus Purge(const PurgeOptions &options, const Request &request) {
+  std::optional<unsigned int> owner_uid;
+  if (!options.owner.empty()) owner_uid = ResolveAccount(options.owner);
+  SharingDB &db = SharingDatabase();
+  const Removal removal =
+      options.automatic ? PurgeLinksAutomatically(db) : PurgeLinks(db, owner_uid, options.project);
+  PrintRemoval(removal, "link", request.json);
+  return EXIT_DONE;
+}
+
+void AddPurge(CLI::App &group, Request &request) {
+  auto options = std::make_shared<PurgeOptions>();
+  CLI::App *command = AddCommand(
+      group, request, "purge", "Remove expired and used-up links, kept ones too",
+      "link purge --owner ann", [options, &request] { return Purge(*options, request); });
+  auto *owner =
+      command->add_option("--owner", options->owner, "Only this account's")->type_name("USER");
+  auto *project = command->add_option("--project", options->project, "Only this application's");
+  command->add_flag("--automatic", options->automatic, "Only those that were not made with --keep")
+      ->excludes(owner)
+      ->excludes(project);
+}
+
+struct WhyOptions {
+  std::string hash, address;
+  SessionOption session;
+};
+
+ExitStatus Why(const WhyOptions &options, const Request &request) {
+  const std::string address = options.address.empty() ? "" : ParseAddress(options.address);
+  const std::optional<Secret> session = options.session.Read();
+  const std::unique_ptr<BaseDB> db = OpenForReading();
+  const Verdict verdict = session ? JudgeSession(*db, options.hash, *session, address)
+                                  : JudgeLogin(*db, options.hash, address);
+  if (request.json) {
+    Json::Value json(Json::objectValue);
+    json["let_in"] = verdict.let_in;
+    json["reason"] = verdict.reason;
+    json["sentence"] = verdict.sentence;
+    PrintJson(json);
+  } else {
+    PrintLine(verdict.sentence);
+  }
+  return verdict.let_in ? EXIT_DONE : EXIT_REFUSED;
+}
+
+void AddWhy(CLI::App &group, Request &request) {
+  auto options = std::make_shared<WhyOptions>();
+  CLI::App *command =
+      AddCommand(group, request, "why", "Tell why a visitor would be refused now; writes nothing",
+                 "link why aB3xK9pQ2 --ip 203.0.113.7",
+                 [options, &request] { return Why(*options, request); });
+  command->add_option("HASH", options->hash, "The link")->required();
+  command->add_option("--ip", options->address, "The visitor's address")->type_name("ADDRESS");
+  options->session.AddTo(*command);
+}
+
+}  // namespace
+
+void AddLinkCommands(CLI::App &program, Request &request) {
+  CLI::App *group = AddGroup(program, "link", "Links", "link list");
+  AddCreate(*group, request);
+  AddList(*group, request);
+  AddShow(*group, request);
+  AddSet(*group, request);
+  AddForHashes(*group, request, "enable", "Switch links on",
+               [](const auto &hashes) { return Enable(hashes, true); });
+  AddForHashes(*group, request, "disable", "Switch links off",
+               [](const auto &hashes) { return Enable(hashes, false); });
+  AddForHashes(*group, request, "delete", "Delete links and the grants on them", Delete);
+  AddPurge(*group, request);
+  AddWhy(*group, request);
+}
+
+}  // namespace command_line

@@ -1,0 +1,88 @@
+#include <clocale>
+#include <exception>
+#include <iostream>
+#include <optional>
+
+#include "command.h"
+#include "output.h"
+
+namespace {
+
+using namespace command_line;
+
+/// The options that nobody knows. Other surplus arguments are not repeated: one may be a password
+/// that was not meant to be an argument.
+std::string UnknownOptions(const CLI::App &program) {
+  std::string text;
+  for (const std::string &argument : program.remaining(true))
+    if (argument.starts_with("-")) text += " " + argument.substr(0, argument.find('='));
+  return text;
+}
+
+std::string UsageMessage(const CLI::App &program, const CLI::ParseError &error) {
+  if (dynamic_cast<const CLI::ExtrasError *>(&error) == nullptr) return error.what();
+  const std::string unknown = UnknownOptions(program);
+  if (!unknown.empty()) return "unknown option:" + unknown;
+  return "an argument too many; a password is never an argument";
+}
+
+/// The command that help is best asked of.
+std::string CommandName(const CLI::App &program) {
+  std::string name = "velksharing";
+  for (const CLI::App *app = &program; !app->get_subcommands().empty();) {
+    app = app->get_subcommands().front();
+    name += " " + app->get_name();
+  }
+  return name;
+}
+
+/// @return what the program ends with when there is nothing to do.
+std::optional<ExitStatus> Parse(CLI::App &program, int argc, char **argv) {
+  try {
+    program.parse(argc, argv);
+    return std::nullopt;
+  } catch (const CLI::Success &help) {
+    program.exit(help);
+    return EXIT_DONE;
+  } catch (const CLI::ParseError &error) {
+    PrintError(UsageMessage(program, error) + "; see " + CommandName(program) + " --help");
+    return EXIT_USAGE;
+  }
+}
+
+ExitStatus Run(const Request &request) {
+  try {
+    return request.action();
+  } catch (const operations::Failure &failure) {
+    return Report(failure);
+  } catch (const std::exception &exception) {
+    PrintError(exception.what());
+    return EXIT_BROKEN;
+  }
+}
+
+}  // namespace
+
+int main(int argc, char **argv) {
+  // Only the characters: numbers and messages stay the same everywhere.
+  std::setlocale(LC_CTYPE, "C.UTF-8");
+
+  CLI::App program("Manages sharing links, visitors' sessions and the sharing database.",
+                   "velksharing");
+  program.set_version_flag("--version", "velksharing " VELKSHARING_VERSION);
+  program.footer("Example:\n  velksharing link create --project files --path /srv/photos");
+  program.require_subcommand(1);
+  Request request;
+  AddLinkCommands(program, request);
+  AddSessionCommands(program, request);
+  AddTokenCommands(program, request);
+  AddBlockCommands(program, request);
+  AddVisitCommands(program, request);
+  AddDatabaseCommands(program, request);
+
+  const std::optional<ExitStatus> parsed = Parse(program, argc, argv);
+  const ExitStatus status = parsed ? *parsed : Run(request);
+  if (std::cout.flush()) return status;
+  std::cerr << "velksharing: the output could not be written\n";
+  return EXIT_BROKEN;
+}
