@@ -46,9 +46,9 @@ class SharingDBPrivate {
   bool Migration() {
     int current = 0;
     if (!ReadVersion(current)) return false;
-    for (int target = current + 1; target <= kSchemaVersion; ++target) {
-      if (MigrateTo(target)) continue;
-      LogError(kSource, "%s:%d (%u) cannot migrate from %d to %d\n\n", target - 1, target);
+    for (int version = current; version < kSchemaVersion; ++version) {
+      if (MigrateTo(version + 1)) continue;
+      LogError(kSource, "%s:%d (%u) cannot migrate from %d to %d\n\n", version, version + 1);
       return false;
     }
     return true;
