@@ -4,12 +4,14 @@
 #include <pwd.h>
 
 #include <cerrno>
+#include <cstring>
 #include <vector>
 
 namespace velk {
 namespace {
 
 constexpr size_t kFirstBufferSize = 1024;
+constexpr size_t kLongestName = 4096;  // modules copy names to the stack, or abort over large ones
 constexpr size_t kLargestBufferSize = 64 << 20;  // a group of a million members fits
 
 /// Calls a reentrant lookup with a buffer that grows until the record fits.
@@ -41,14 +43,14 @@ Group KeepGroup(const group &record) {
   return {record.gr_name, record.gr_gid};
 }
 
-bool IsMissing(const char *name) {
-  return name == nullptr || *name == '\0';
+bool CanBeAName(const char *name) {
+  return name != nullptr && *name != '\0' && strnlen(name, kLongestName + 1) <= kLongestName;
 }
 
 }  // namespace
 
 std::optional<Account> FindAccount(const char *name) {
-  if (IsMissing(name)) return std::nullopt;
+  if (!CanBeAName(name)) return std::nullopt;
   return LookUp<passwd>(
       [name](passwd *record, char *buffer, size_t size, passwd **found) {
         return getpwnam_r(name, record, buffer, size, found);
@@ -65,7 +67,7 @@ std::optional<Account> FindAccount(uid_t uid) {
 }
 
 std::optional<Group> FindGroup(const char *name) {
-  if (IsMissing(name)) return std::nullopt;
+  if (!CanBeAName(name)) return std::nullopt;
   return LookUp<group>(
       [name](group *record, char *buffer, size_t size, group **found) {
         return getgrnam_r(name, record, buffer, size, found);

@@ -8,8 +8,8 @@
 /// Accounts and groups, as the name service of the machine (files, LDAP, Active Directory …)
 /// knows them, and the blocking of addresses that keep failing to log in.
 ///
-/// Account calls may be made from any thread. Names are byte strings; a null or empty name is
-/// never found.
+/// Account calls may be made from any thread. Names are byte strings; a null or empty name, and
+/// one of more than 4096 bytes, is never found.
 
 #ifdef __cplusplus
 extern "C" {
