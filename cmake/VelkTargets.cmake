@@ -1,5 +1,9 @@
 # Flags and helpers that our targets share. Nothing here leaks to whoever links us.
 
+# Installed programs find the libraries beside them, wherever the tree has been moved to.
+file(RELATIVE_PATH libraries_from_programs ${CMAKE_INSTALL_FULL_SBINDIR} ${CMAKE_INSTALL_FULL_LIBDIR})
+set(CMAKE_INSTALL_RPATH "$ORIGIN/${libraries_from_programs}")
+
 # Every target of ours: warnings, hidden visibility.
 add_library(velk_flags INTERFACE)
 target_compile_options(velk_flags INTERFACE -Wall -Wextra -Wpedantic -Wshadow
@@ -23,7 +27,10 @@ function(velk_platform_library name)
     $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
   target_link_libraries(${name} PRIVATE $<BUILD_INTERFACE:velk_flags>
                         $<BUILD_INTERFACE:velk_paths> ${arg_LIBRARIES})
-  target_link_options(${name} PRIVATE -Wl,--no-undefined -Wl,-z,relro -Wl,-z,now)
-  set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1 INSTALL_RPATH "$ORIGIN")
+  target_link_options(${name} PRIVATE
+    -Wl,--version-script=${PROJECT_SOURCE_DIR}/platform/exports.map
+    -Wl,--no-undefined -Wl,-z,relro -Wl,-z,now)
+  set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1 INSTALL_RPATH "$ORIGIN"
+    LINK_DEPENDS ${PROJECT_SOURCE_DIR}/platform/exports.map)
   install(TARGETS ${name} EXPORT velksharing-targets LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
 endfunction()

@@ -189,7 +189,7 @@ bool BaseDB::Update(const std::string &table, const std::map<std::string, std::s
   const char *separator = "";
   for (const auto &[column, value] : columns) {
     if (column == SZK_ID_) continue;
-    sql += separator + Escape(column) + "='" + Escape(value) + "'";
+    sql.append(separator).append(Escape(column)).append("='").append(Escape(value)).append("'");
     separator = ",";
   }
   return Execute(sql + " WHERE id=" + std::to_string(id));
