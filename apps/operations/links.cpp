@@ -132,9 +132,12 @@ LinkList ListLinks(BaseDB &db, const LinkQuery &query) {
   return list;
 }
 
-Removal PurgeLinks(BaseDB &db, std::optional<unsigned int> owner_uid, const std::string &project) {
-  return PurgeResult(db,
-                     EntryDB(db).PurgeExpiredByOwnerProject(owner_uid.value_or(UID_ERR), project));
+Removal PurgeLinks(BaseDB &db, std::optional<unsigned int> owner_uid,
+                   const std::optional<std::string> &project) {
+  // To the store an empty name means every application.
+  if (project && project->empty()) throw Failure(Failure::INVALID, "the project must not be empty");
+  return PurgeResult(db, EntryDB(db).PurgeExpiredByOwnerProject(owner_uid.value_or(UID_ERR),
+                                                                project.value_or("")));
 }
 
 Removal PurgeLinksAutomatically(BaseDB &db) {

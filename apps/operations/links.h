@@ -65,8 +65,9 @@ LinkList ListLinks(BaseDB &db, const LinkQuery &query);
 /// Removes the links that are past their expiry or used up, whether or not they are marked for
 /// automatic removal.
 /// @param owner_uid only this owner's; absent: every owner's.
-/// @param project only this application's; "": every application's.
-Removal PurgeLinks(BaseDB &db, std::optional<unsigned int> owner_uid, const std::string &project);
+/// @param project only this application's, not empty; absent: every application's.
+Removal PurgeLinks(BaseDB &db, std::optional<unsigned int> owner_uid,
+                   const std::optional<std::string> &project);
 
 /// Removes those of them that are marked for automatic removal.
 Removal PurgeLinksAutomatically(BaseDB &db);

@@ -5,6 +5,7 @@
 #include "operations/json_form.h"
 #include "operations/moment.h"
 #include "output.h"
+#include "text_option.h"
 #include "time_input.h"
 
 namespace command_line {
@@ -41,14 +42,14 @@ void AddList(CLI::App &group, Request &request) {
 
 struct AddOptions {
   std::vector<std::string> addresses;
-  std::string duration;
+  TextOption duration;
 };
 
-ExitStatus Add(const AddOptions &options) {
-  const long seconds = options.duration.empty() ? 0 : ParseDuration(options.duration);
-  return ForEach(options.addresses, [&](const std::string &address) {
+ExitStatus Add(const AddOptions &options, const Request &request) {
+  const long seconds = options.duration.given() ? ParseDuration(*options.duration.value()) : 0;
+  return ForEach(options.addresses, request, [&](const std::string &address) {
     AddBlock(address, seconds);
-    PrintLine(address + " blocked");
+    return Done{address, address + " blocked"};
   });
 }
 
@@ -56,25 +57,25 @@ void AddAdd(CLI::App &group, Request &request) {
   auto options = std::make_shared<AddOptions>();
   CLI::App *command =
       AddCommand(group, request, "add", "Block addresses", "block add 203.0.113.7 --for 7d",
-                 [options] { return Add(*options); });
+                 [options, &request] { return Add(*options, request); });
   command->add_option("ADDRESS", options->addresses, "IPv4 or IPv6; IPv6 counts by its /64")
       ->required();
-  command->add_option("--for", options->duration, "How long: 30m, 2h, 7d; for ever when not given")
-      ->type_name("DURATION");
+  options->duration.AddTo(*command, "--for", "DURATION",
+                          "How long: 30m, 2h, 7d; for ever when not given");
 }
 
-ExitStatus Remove(const std::vector<std::string> &addresses) {
-  return ForEach(addresses, [](const std::string &address) {
+ExitStatus Remove(const std::vector<std::string> &addresses, const Request &request) {
+  return ForEach(addresses, request, [](const std::string &address) {
     RemoveBlock(address);
-    PrintLine(address + " forgotten");
+    return Done{address, address + " forgotten"};
   });
 }
 
 void AddRemove(CLI::App &group, Request &request) {
   auto addresses = std::make_shared<std::vector<std::string>>();
-  CLI::App *command =
-      AddCommand(group, request, "remove", "Forget the block and the failures of addresses",
-                 "block remove 203.0.113.7", [addresses] { return Remove(*addresses); });
+  CLI::App *command = AddCommand(
+      group, request, "remove", "Forget the block and the failures of addresses",
+      "block remove 203.0.113.7", [addresses, &request] { return Remove(*addresses, request); });
   command->add_option("ADDRESS", *addresses, "IPv4 or IPv6")->required();
 }
 

@@ -70,4 +70,15 @@ ExitStatus Report(const operations::Failure &failure) {
   return EXIT_BROKEN;
 }
 
+void PrintDone(const std::vector<Done> &all, bool json) {
+  if (!json) {
+    for (const Done &done : all) PrintLine(done.line);
+    return;
+  }
+  Json::Value list(Json::objectValue);
+  list["done"] = Json::arrayValue;
+  for (const Done &done : all) list["done"].append(done.json);
+  PrintJson(list);
+}
+
 }  // namespace command_line

@@ -1,9 +1,13 @@
 #ifndef VELKSHARING_CLI_COMMAND_H
 #define VELKSHARING_CLI_COMMAND_H
 
+#include <json/value.h>
+
 #include <CLI/CLI.hpp>
+#include <algorithm>
 #include <functional>
 #include <string>
+#include <vector>
 
 #include "operations/database.h"
 
@@ -47,24 +51,33 @@ class PageOptions {
   int limit_ = 50;
 };
 
-/// Does `step` for every one of `items`; one that is refused is reported and the others are done.
-template <typename Item, typename Step>
-ExitStatus ForEach(const std::vector<Item> &items, Step step);
-
 /// Reports a failure on standard error.
 /// @return the exit status that goes with it.
 ExitStatus Report(const operations::Failure &failure);
 
+/// What was done to one of several things.
+struct Done {
+  Json::Value json;  ///< For machines.
+  std::string line;  ///< For people.
+};
+
+/// One line for each, or all in the member "done" of an object.
+void PrintDone(const std::vector<Done> &all, bool json);
+
+/// Does `step`, which gives a Done, for every one of `items` and prints what was done. One that
+/// fails is reported, and the others are done all the same.
 template <typename Item, typename Step>
-ExitStatus ForEach(const std::vector<Item> &items, Step step) {
+ExitStatus ForEach(const std::vector<Item> &items, const Request &request, Step step) {
   ExitStatus status = EXIT_DONE;
+  std::vector<Done> all;
   for (const Item &item : items) {
     try {
-      step(item);
+      all.push_back(step(item));
     } catch (const operations::Failure &failure) {
       status = std::max(status, Report(failure));
     }
   }
+  PrintDone(all, request.json);
   return status;
 }
 

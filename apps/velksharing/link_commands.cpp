@@ -14,6 +14,7 @@
 #include "operations/verdict.h"
 #include "output.h"
 #include "session_option.h"
+#include "text_option.h"
 
 namespace command_line {
 namespace {
@@ -128,7 +129,8 @@ void AddShow(CLI::App &group, Request &request) {
 }
 
 struct ListOptions {
-  std::string project, owner, state;
+  TextOption project, owner;
+  std::string state;
   LinkOrder order = BY_ID;
   bool descending = false;
   PageOptions page;
@@ -147,8 +149,8 @@ const std::map<std::string, LinkOrder> ORDERS = {
 
 LinkQuery ToQuery(const ListOptions &options) {
   LinkQuery query;
-  if (!options.project.empty()) query.project = options.project;
-  if (!options.owner.empty()) query.owner_uid = ResolveAccount(options.owner);
+  query.project = options.project.value();
+  if (options.owner.given()) query.owner_uid = ResolveAccount(*options.owner.value());
   query.state = LinkStateFromName(options.state);
   query.order = options.order;
   query.descending = options.descending;
@@ -186,8 +188,8 @@ void AddList(CLI::App &group, Request &request) {
   CLI::App *command =
       AddCommand(group, request, "list", "List links", "link list --state expired --sort expire",
                  [options, &request] { return List(*options, request); });
-  command->add_option("--project", options->project, "Only this application's");
-  command->add_option("--owner", options->owner, "Only this account's")->type_name("USER");
+  options->project.AddTo(*command, "--project", "NAME", "Only this application's");
+  options->owner.AddTo(*command, "--owner", "USER", "Only this account's");
   command->add_option("--state", options->state, "Only links in this state")
       ->check(CLI::IsMember({"active", "pending", "used-up", "expired", "disabled"}));
   command->add_option("--sort", options->order, "Order by this field; id when not given")
@@ -198,44 +200,47 @@ void AddList(CLI::App &group, Request &request) {
   options->page.AddTo(*command);
 }
 
-ExitStatus Enable(const std::vector<std::string> &hashes, bool enabled) {
+ExitStatus Enable(const std::vector<std::string> &hashes, bool enabled, const Request &request) {
   LinkChange change;
   change.enabled = enabled;
   SharingDB &db = SharingDatabase();
-  return ForEach(hashes, [&](const std::string &hash) {
-    ChangeLink(db, hash, change);
-    PrintLine(hash + (enabled ? " enabled" : " disabled"));
+  return ForEach(hashes, request, [&](const std::string &hash) {
+    const Entry link = ChangeLink(db, hash, change);
+    return Done{ToJson(link), hash + (enabled ? " enabled" : " disabled")};
   });
 }
 
-ExitStatus Delete(const std::vector<std::string> &hashes) {
+ExitStatus Delete(const std::vector<std::string> &hashes, const Request &request) {
   SharingDB &db = SharingDatabase();
-  return ForEach(hashes, [&](const std::string &hash) {
+  return ForEach(hashes, request, [&](const std::string &hash) {
     const int grants = DeleteLink(db, hash);
-    PrintLine(hash + " deleted" + (grants == 0 ? "" : " with " + Counted(grants, "grant")));
+    Json::Value json(Json::objectValue);
+    json["hash"] = hash;
+    json["tokens"] = grants;
+    return Done{json, hash + " deleted with " + Counted(grants, "grant")};
   });
 }
 
-void AddForHashes(CLI::App &group, Request &request, const std::string &name,
-                  const std::string &description,
-                  std::function<ExitStatus(const std::vector<std::string> &)> action) {
+void AddForHashes(
+    CLI::App &group, Request &request, const std::string &name, const std::string &description,
+    std::function<ExitStatus(const std::vector<std::string> &, const Request &)> action) {
   auto hashes = std::make_shared<std::vector<std::string>>();
   CLI::App *command = AddCommand(group, request, name, description, "link " + name + " aB3xK9pQ2",
-                                 [hashes, action] { return action(*hashes); });
+                                 [hashes, action, &request] { return action(*hashes, request); });
   command->add_option("HASH", *hashes, "The links")->required();
 }
 
 struct PurgeOptions {
-  std::string owner, project;
+  TextOption owner, project;
   bool automatic = false;
 };
 
 ExitStatus Purge(const PurgeOptions &options, const Request &request) {
   std::optional<unsigned int> owner_uid;
-  if (!options.owner.empty()) owner_uid = ResolveAccount(options.owner);
+  if (options.owner.given()) owner_uid = ResolveAccount(*options.owner.value());
   SharingDB &db = SharingDatabase();
-  const Removal removal =
-      options.automatic ? PurgeLinksAutomatically(db) : PurgeLinks(db, owner_uid, options.project);
+  const Removal removal = options.automatic ? PurgeLinksAutomatically(db)
+                                            : PurgeLinks(db, owner_uid, options.project.value());
   PrintRemoval(removal, "link", request.json);
   return EXIT_DONE;
 }
@@ -245,21 +250,22 @@ void AddPurge(CLI::App &group, Request &request) {
   CLI::App *command = AddCommand(
       group, request, "purge", "Remove expired and used-up links, kept ones too",
       "link purge --owner ann", [options, &request] { return Purge(*options, request); });
-  auto *owner =
-      command->add_option("--owner", options->owner, "Only this account's")->type_name("USER");
-  auto *project = command->add_option("--project", options->project, "Only this application's");
+  CLI::Option *owner = options->owner.AddTo(*command, "--owner", "USER", "Only this account's");
+  CLI::Option *project =
+      options->project.AddTo(*command, "--project", "NAME", "Only this application's");
   command->add_flag("--automatic", options->automatic, "Only those that were not made with --keep")
       ->excludes(owner)
       ->excludes(project);
 }
 
 struct WhyOptions {
-  std::string hash, address;
+  std::string hash;
+  TextOption address;
   SessionOption session;
 };
 
 ExitStatus Why(const WhyOptions &options, const Request &request) {
-  const std::string address = options.address.empty() ? "" : ParseAddress(options.address);
+  const std::string address = options.address.given() ? ParseAddress(*options.address.value()) : "";
   const std::optional<Secret> session = options.session.Read();
   const std::unique_ptr<BaseDB> db = OpenForReading();
   const Verdict verdict = session ? JudgeSession(*db, options.hash, *session, address)
@@ -283,7 +289,7 @@ void AddWhy(CLI::App &group, Request &request) {
                  "link why aB3xK9pQ2 --ip 203.0.113.7",
                  [options, &request] { return Why(*options, request); });
   command->add_option("HASH", options->hash, "The link")->required();
-  command->add_option("--ip", options->address, "The visitor's address")->type_name("ADDRESS");
+  options->address.AddTo(*command, "--ip", "ADDRESS", "The visitor's address");
   options->session.AddTo(*command);
 }
 
@@ -295,10 +301,12 @@ void AddLinkCommands(CLI::App &program, Request &request) {
   AddList(*group, request);
   AddShow(*group, request);
   AddSet(*group, request);
-  AddForHashes(*group, request, "enable", "Switch links on",
-               [](const auto &hashes) { return Enable(hashes, true); });
-  AddForHashes(*group, request, "disable", "Switch links off",
-               [](const auto &hashes) { return Enable(hashes, false); });
+  AddForHashes(
+      *group, request, "enable", "Switch links on",
+      [](const auto &hashes, const Request &asked) { return Enable(hashes, true, asked); });
+  AddForHashes(
+      *group, request, "disable", "Switch links off",
+      [](const auto &hashes, const Request &asked) { return Enable(hashes, false, asked); });
   AddForHashes(*group, request, "delete", "Delete links and the grants on them", Delete);
   AddPurge(*group, request);
   AddWhy(*group, request);

@@ -61,10 +61,9 @@ void LinkOptions::AddClearingTo(CLI::App &command) {
 }
 
 void LinkOptions::AddIdentity(CLI::App &command) {
-  project_option_ = command.add_option("--project", project_, "Application that shares");
-  owner_option_ =
-      command.add_option("--owner", owner_, "Account on whose behalf is shared")->type_name("USER");
-  title_option_ = command.add_option("--title", title_, "Title shown with the prompt");
+  project_.AddTo(command, "--project", "NAME", "Application that shares");
+  owner_.AddTo(command, "--owner", "USER", "Account on whose behalf is shared");
+  title_.AddTo(command, "--title", "TEXT", "Title shown with the prompt");
 }
 
 void LinkOptions::AddProtection(CLI::App &command) {
@@ -89,17 +88,11 @@ void LinkOptions::AddProtection(CLI::App &command) {
 }
 
 void LinkOptions::AddLimits(CLI::App &command) {
-  start_option_ = command
-                      .add_option("--start", start_,
-                                  "Usable from this moment: \"2026-12-31 18:00\", RFC 3339, "
-                                  "@seconds, +2h; never: no start")
-                      ->type_name("TIME");
-  expire_option_ =
-      command
-          .add_option("--expire", expire_, "Usable until this moment, as --start; never: no end")
-          ->type_name("TIME");
-  uses_option_ =
-      command.add_option("--uses", uses_, "Number of logins allowed, or unlimited")->type_name("N");
+  start_.AddTo(command, "--start", "TIME",
+               "Usable from this moment: \"2026-12-31 18:00\", RFC 3339, @seconds, +2h; "
+               "never: no start");
+  expire_.AddTo(command, "--expire", "TIME", "Usable until this moment, as --start; never: no end");
+  uses_.AddTo(command, "--uses", "N", "Number of logins allowed, or unlimited");
   auto *match = command.add_flag("--match-ip", match_ip_,
                                  "Hold a visitor to the address of the login (as a new link does)");
   command.add_flag("--no-match-ip", no_match_ip_, "Let a visitor change the address")
@@ -111,32 +104,23 @@ void LinkOptions::AddLimits(CLI::App &command) {
 }
 
 void LinkOptions::AddRedirect(CLI::App &command) {
-  redirect_option_ = command.add_option("--redirect", redirect_, "Where a visitor is sent")
-                         ->type_name("KIND")
-                         ->check(CLI::IsMember({"none", "url_param", "always"}));
-  redirect_uri_option_ =
-      command.add_option("--redirect-uri", redirect_uri_, "Target of the redirect")
-          ->type_name("URI");
+  redirect_.AddTo(command, "--redirect", "KIND", "Where a visitor is sent")
+      ->check(CLI::IsMember({"none", "url_param", "always"}));
+  redirect_uri_.AddTo(command, "--redirect-uri", "URI", "Target of the redirect");
 }
 
 void LinkOptions::AddDocuments(CLI::App &command) {
-  app_option_ =
-      command.add_option("--app", app_, "The application's data, a JSON object")->type_name("JSON");
-  path_option_ = command.add_option("--path", path_, "Short for --app '{\"path\": PATH}'")
-                     ->type_name("PATH")
-                     ->excludes(app_option_);
-  private_data_option_ =
-      command
-          .add_option("--private-data", private_data_,
-                      "Data of the application that front ends do not show, a JSON object")
-          ->type_name("JSON");
+  CLI::Option *app = app_.AddTo(command, "--app", "JSON", "The application's data, a JSON object");
+  path_.AddTo(command, "--path", "PATH", "Short for --app '{\"path\": PATH}'")->excludes(app);
+  private_data_.AddTo(command, "--private-data", "JSON",
+                      "Data of the application that front ends do not show, a JSON object");
 }
 
 LinkChange LinkOptions::ToChange() const {
   LinkChange change;
-  if (project_option_->count() != 0) change.project = project_;
-  if (owner_option_->count() != 0) change.owner_uid = operations::ResolveAccount(owner_);
-  if (title_option_->count() != 0) change.title = title_;
+  change.project = project_.value();
+  if (owner_.given()) change.owner_uid = operations::ResolveAccount(*owner_.value());
+  change.title = title_.value();
   ReadLimits(change);
   ReadRedirect(change);
   ReadDocuments(change);
@@ -155,27 +139,27 @@ void LinkOptions::ReadProtection(LinkChange &change) const {
 
 void LinkOptions::ReadLimits(LinkChange &change) const {
   const long now = operations::Now();
-  if (start_option_->count() != 0) change.start_at = ParseLimit(start_, now);
-  if (expire_option_->count() != 0) change.expire_at = ParseLimit(expire_, now);
-  if (uses_option_->count() != 0) change.expire_times = ParseUses(uses_);
+  if (start_.given()) change.start_at = ParseLimit(*start_.value(), now);
+  if (expire_.given()) change.expire_at = ParseLimit(*expire_.value(), now);
+  if (uses_.given()) change.expire_times = ParseUses(*uses_.value());
   change.match_ip = Choice(match_ip_, no_match_ip_);
   change.auto_remove = Choice(auto_remove_, keep_);
 }
 
 void LinkOptions::ReadRedirect(LinkChange &change) const {
-  if (redirect_option_->count() != 0) change.redirect_type = ParseRedirect(redirect_);
-  if (redirect_uri_option_->count() != 0) change.redirect_uri = redirect_uri_;
+  if (redirect_.given()) change.redirect_type = ParseRedirect(*redirect_.value());
+  change.redirect_uri = redirect_uri_.value();
 }
 
 void LinkOptions::ReadDocuments(LinkChange &change) const {
-  if (app_option_->count() != 0) change.app = operations::ParseJsonObject("--app", app_);
-  if (path_option_->count() != 0) {
+  if (app_.given()) change.app = operations::ParseJsonObject("--app", *app_.value());
+  if (path_.given()) {
     Json::Value app(Json::objectValue);
-    app["path"] = path_;
+    app["path"] = *path_.value();
     change.app = app;
   }
-  if (private_data_option_->count() != 0)
-    change.private_data = operations::ParseJsonObject("--private-data", private_data_);
+  if (private_data_.given())
+    change.private_data = operations::ParseJsonObject("--private-data", *private_data_.value());
 }
 
 }  // namespace command_line

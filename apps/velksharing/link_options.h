@@ -7,6 +7,7 @@
 
 #include "operations/link_change.h"
 #include "password_input.h"
+#include "text_option.h"
 
 namespace command_line {
 
@@ -18,7 +19,7 @@ class LinkOptions {
   /// What only makes sense for a link that exists.
   void AddClearingTo(CLI::App &command);
 
-  CLI::Option *project() const { return project_option_; }
+  CLI::Option *project() const { return project_.option(); }
 
   /// What the options ask for; reads or asks for the password where one is wanted.
   /// @throws operations::Failure.
@@ -36,8 +37,8 @@ class LinkOptions {
   void ReadRedirect(operations::LinkChange &change) const;
   void ReadDocuments(operations::LinkChange &change) const;
 
-  std::string project_, owner_, title_, start_, expire_, uses_, redirect_, redirect_uri_;
-  std::string app_, path_, private_data_;
+  TextOption project_, owner_, title_, start_, expire_, uses_, redirect_, redirect_uri_;
+  TextOption app_, path_, private_data_;
   std::vector<std::string> users_, groups_;
   bool ask_password_ = false;
   bool allow_unknown_ = false;
@@ -50,20 +51,9 @@ class LinkOptions {
   bool keep_ = false;
   PasswordSource password_source_;
 
-  CLI::Option *project_option_ = nullptr;
-  CLI::Option *owner_option_ = nullptr;
   CLI::Option *ask_password_option_ = nullptr;
   CLI::Option *users_option_ = nullptr;
   CLI::Option *groups_option_ = nullptr;
-  CLI::Option *title_option_ = nullptr;
-  CLI::Option *redirect_option_ = nullptr;
-  CLI::Option *redirect_uri_option_ = nullptr;
-  CLI::Option *app_option_ = nullptr;
-  CLI::Option *path_option_ = nullptr;
-  CLI::Option *private_data_option_ = nullptr;
-  CLI::Option *start_option_ = nullptr;
-  CLI::Option *expire_option_ = nullptr;
-  CLI::Option *uses_option_ = nullptr;
 };
 
 }  // namespace command_line

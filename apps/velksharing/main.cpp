@@ -1,6 +1,7 @@
 #include <clocale>
 #include <exception>
 #include <iostream>
+#include <memory>
 #include <optional>
 
 #include "command.h"
@@ -10,7 +11,7 @@ namespace {
 
 using namespace command_line;
 
-/// The options that nobody knows. Other surplus arguments are not repeated: one may be a password
+/// The options that nobody knows. Other surplus texts are not repeated here: one may be a password
 /// that was not meant to be an argument.
 std::string UnknownOptions(const CLI::App &program) {
   std::string text;
@@ -20,11 +21,23 @@ std::string UnknownOptions(const CLI::App &program) {
 }
 
 std::string UsageMessage(const CLI::App &program, const CLI::ParseError &error) {
-  if (dynamic_cast<const CLI::ExtrasError *>(&error) == nullptr) return error.what();
+  const std::string message = error.what();
+  if (dynamic_cast<const CLI::ConversionError *>(&error) != nullptr)
+    return message.substr(0, message.find(" = "));
+  if (dynamic_cast<const CLI::ExtrasError *>(&error) == nullptr) return message;
   const std::string unknown = UnknownOptions(program);
   if (!unknown.empty()) return "unknown option:" + unknown;
   return "an argument too many; a password is never an argument";
 }
+
+/// Help without the lists of options that exclude each other: the refusal names them.
+class HelpFormatter : public CLI::Formatter {
+ public:
+  std::string make_option_opts(const CLI::Option *option) const override {
+    const bool flag = option->get_type_size() == 0;
+    return flag || option->get_positional() ? "" : " " + option->get_type_name();
+  }
+};
 
 /// The command that help is best asked of.
 std::string CommandName(const CLI::App &program) {
@@ -69,6 +82,7 @@ int main(int argc, char **argv) {
 
   CLI::App program("Manages sharing links, visitors' sessions and the sharing database.",
                    "velksharing");
+  program.formatter(std::make_shared<HelpFormatter>());
   program.set_version_flag("--version", "velksharing " VELKSHARING_VERSION);
   program.footer("Example:\n  velksharing link create --project files --path /srv/photos");
   program.require_subcommand(1);

@@ -7,6 +7,7 @@
 #include "operations/moment.h"
 #include "operations/sessions.h"
 #include "output.h"
+#include "text_option.h"
 
 namespace command_line {
 namespace {
@@ -14,7 +15,7 @@ namespace {
 using namespace operations;
 
 struct ListOptions {
-  std::string user, address;
+  TextOption user, address;
   PageOptions page;
 };
 
@@ -31,8 +32,8 @@ void PrintSessions(const SessionList &list) {
 
 ExitStatus List(const ListOptions &options, const Request &request) {
   SessionQuery query;
-  if (!options.user.empty()) query.uid = ResolveAccount(options.user);
-  if (!options.address.empty()) query.address = ParseAddress(options.address);
+  if (options.user.given()) query.uid = ResolveAccount(*options.user.value());
+  if (options.address.given()) query.address = ParseAddress(*options.address.value());
   query.page = options.page.ToPage();
   const SessionList list = ListSessions(SharingDatabase(), query);
   if (request.json)
@@ -47,16 +48,16 @@ void AddList(CLI::App &group, Request &request) {
   CLI::App *command = AddCommand(group, request, "list", "List live sessions, the newest first",
                                  "session list --user ann",
                                  [options, &request] { return List(*options, request); });
-  command->add_option("--user", options->user, "Only this account's")->type_name("USER");
-  command->add_option("--ip", options->address, "Only from this address")->type_name("ADDRESS");
+  options->user.AddTo(*command, "--user", "USER", "Only this account's");
+  options->address.AddTo(*command, "--ip", "ADDRESS", "Only from this address");
   options->page.AddTo(*command);
 }
 
-ExitStatus Delete(const std::vector<int> &ids) {
+ExitStatus Delete(const std::vector<int> &ids, const Request &request) {
   SharingDB &db = SharingDatabase();
-  return ForEach(ids, [&](int id) {
+  return ForEach(ids, request, [&](int id) {
     DeleteSession(db, id);
-    PrintLine("session " + std::to_string(id) + " deleted");
+    return Done{id, "session " + std::to_string(id) + " deleted"};
   });
 }
 
@@ -64,7 +65,7 @@ void AddDelete(CLI::App &group, Request &request) {
   auto ids = std::make_shared<std::vector<int>>();
   CLI::App *command =
       AddCommand(group, request, "delete", "Delete sessions: their visitors are logged out",
-                 "session delete 17", [ids] { return Delete(*ids); });
+                 "session delete 17", [ids, &request] { return Delete(*ids, request); });
   command->add_option("ID", *ids, "Row ids, as the list shows them")->required();
 }
 

@@ -5,6 +5,7 @@
 #include "operations/moment.h"
 #include "operations/sessions.h"
 #include "output.h"
+#include "text_option.h"
 
 namespace command_line {
 namespace {
@@ -12,7 +13,7 @@ namespace {
 using namespace operations;
 
 struct ListOptions {
-  std::string hash;
+  TextOption hash;
   int session_id = 0;
   PageOptions page;
 };
@@ -30,7 +31,7 @@ void PrintGrants(const GrantList &list) {
 
 ExitStatus List(const ListOptions &options, const Request &request) {
   GrantQuery query;
-  if (!options.hash.empty()) query.hash = options.hash;
+  query.hash = options.hash.value();
   if (options.session_id != 0) query.session_id = options.session_id;
   query.page = options.page.ToPage();
   const GrantList list = ListGrants(SharingDatabase(), query);
@@ -46,26 +47,26 @@ void AddList(CLI::App &group, Request &request) {
   CLI::App *command = AddCommand(group, request, "list", "List live grants, the newest first",
                                  "token list --link aB3xK9pQ2",
                                  [options, &request] { return List(*options, request); });
-  command->add_option("--link", options->hash, "Only on this link")->type_name("HASH");
+  options->hash.AddTo(*command, "--link", "HASH", "Only on this link");
   command->add_option("--session", options->session_id, "Only of the session with this row id")
       ->type_name("ID")
       ->check(CLI::PositiveNumber);
   options->page.AddTo(*command);
 }
 
-ExitStatus Delete(const std::vector<int> &ids) {
+ExitStatus Delete(const std::vector<int> &ids, const Request &request) {
   SharingDB &db = SharingDatabase();
-  return ForEach(ids, [&](int id) {
+  return ForEach(ids, request, [&](int id) {
     DeleteGrant(db, id);
-    PrintLine("grant " + std::to_string(id) + " deleted");
+    return Done{id, "grant " + std::to_string(id) + " deleted"};
   });
 }
 
 void AddDelete(CLI::App &group, Request &request) {
   auto ids = std::make_shared<std::vector<int>>();
-  CLI::App *command = AddCommand(group, request, "delete",
-                                 "Delete grants: their visitors must log in to that link again",
-                                 "token delete 23", [ids] { return Delete(*ids); });
+  CLI::App *command = AddCommand(
+      group, request, "delete", "Delete grants: their visitors must log in to that link again",
+      "token delete 23", [ids, &request] { return Delete(*ids, request); });
   command->add_option("ID", *ids, "Row ids, as the list shows them")->required();
 }
 

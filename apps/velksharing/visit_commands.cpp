@@ -6,6 +6,7 @@
 #include "output.h"
 #include "password_input.h"
 #include "session_option.h"
+#include "text_option.h"
 
 namespace command_line {
 namespace {
@@ -15,7 +16,7 @@ using namespace operations;
 struct VisitOptions {
   std::string hash;
   std::string address = "127.0.0.1";
-  std::string account;
+  TextOption account;
   bool no_password = false;
   bool keep_block_state = false;
   PasswordSource password;
@@ -30,7 +31,7 @@ void AddVisitor(CLI::App &command, VisitOptions &options) {
 }
 
 void AddCredentials(CLI::App &command, VisitOptions &options) {
-  command.add_option("--as", options.account, "Account that the visitor names")->type_name("USER");
+  options.account.AddTo(command, "--as", "USER", "Account that the visitor names");
   options.password.AddTo(command);
   command.add_flag("--no-password", options.no_password, "Present no password and ask for none")
       ->excludes(options.password.from_input())
@@ -43,7 +44,7 @@ Visit ToVisit(const VisitOptions &options) {
   visit.address = ParseAddress(options.address);
   visit.session_id = options.session.Read();
   visit.keep_block_state = options.keep_block_state;
-  if (!options.account.empty()) visit.account = options.account;
+  visit.account = options.account.value();
   return visit;
 }
 
