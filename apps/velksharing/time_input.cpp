@@ -111,7 +111,7 @@ long ParseMoment(const std::string &text, long now) {
   throw Failure(Failure::INVALID,
                 "“" + text +
                     "” is not a time; write it as \"2026-12-31 18:00\", 2026-12-31T18:00:00Z, "
-                    "@1767200400 or +7d");
+                    "@1798740000 or +7d");
 }
 
 long ParseLimit(const std::string &text, long now) {

@@ -10,7 +10,7 @@ namespace command_line {
 /// A moment in seconds since the Unix epoch, from
 ///   "2026-12-31 18:00", "2026-12-31 18:00:05"   local time ("T" may stand for the blank)
 ///   "2026-12-31T18:00:05Z", "…+02:00"           RFC 3339
-///   "@1767200400"                               the number itself
+///   "@1798740000"                               the number itself
 ///   "+30m", "+2h", "+7d", "+1w", "+45s"         from `now`
 /// A local time that a change of the clocks skips is refused.
 /// @return more than 0, up to the end of the year 9999.
