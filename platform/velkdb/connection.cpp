@@ -1,6 +1,7 @@
 #include "connection.h"
 
 #include <sqlite3.h>
+#include <sys/stat.h>
 
 #include <cstdlib>
 #include <new>
@@ -39,11 +40,29 @@ bool Open(const std::string &path, VELKDBHandle &handle) {
          Switch(connection, SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0);
 }
 
+bool IsEmpty(const std::string &path) {
+  struct stat file {};
+  return stat(path.c_str(), &file) == 0 && file.st_size == 0;
+}
+
+// Whoever makes the first change may not be allowed to make a log beside the file any more. Where
+// it cannot be made now either, that change fails, with a text to it.
+void SwitchToLog(VELKDBHandle &handle) {
+  const auto switch_now = [&handle] {
+    return sqlite3_exec(handle.sqlite.get(), "PRAGMA journal_mode = WAL", nullptr, nullptr,
+                        nullptr);
+  };
+  handle.busy_wait.StartStatement();
+  for (int attempt = 0; switch_now() == SQLITE_BUSY && handle.busy_wait.Sleep(attempt);) ++attempt;
+  handle.busy_wait.EndStatement();
+}
+
 std::unique_ptr<VELKDBHandle> Connect(const std::string &path) {
   auto handle = std::make_unique<VELKDBHandle>();
   const std::string resolved = WithDirectoryResolved(path);
   if (resolved.empty() || !Open(resolved, *handle)) return nullptr;
   handle->busy_wait.Attach(handle->sqlite.get());
+  if (IsEmpty(resolved)) SwitchToLog(*handle);
   handle->durability.Attach(handle->sqlite.get());
   // Reads the file, and by that opens its log while the caller still is who may open it. A file
   // that cannot be read now is the first statement's failure, with a text to it.

@@ -30,6 +30,7 @@ using velk_test::RunForked;
 using velk_test::RunForkedTogether;
 using velk_test::TempDir;
 using velk_test::VelkDbConnection;
+using velk_test::WriteFile;
 
 constexpr unsigned int kNobody = 65534;
 
@@ -463,6 +464,28 @@ int RunAsNobody(const std::function<int()> &body) {
     if (geteuid() == 0 && (setgid(kNobody) != 0 || setuid(kNobody) != 0)) return 100;
     return body();
   });
+}
+
+TEST_F(VelkDb, AnEmptyFileIsSwitchedToWal) {
+  const std::string path = folder_.File("empty.db");
+  WriteFile(path, "");
+  VelkDbConnection database(path);
+  EXPECT_EQ(database.Value("PRAGMA journal_mode", "journal_mode"), "wal");
+}
+
+TEST_F(VelkDb, AnEmptyFileCanBeFilledByAnAccountThatCouldNotHaveOpenedIt) {
+  if (geteuid() != 0) GTEST_SKIP() << "needs root";
+  const std::string path = folder_.File("empty.db");
+  WriteFile(path, "");
+  chmod(path.c_str(), 0600);
+  EXPECT_EQ(
+      RunForked([&path] {
+        VelkDbConnection database(path);
+        if (!database.IsOpen() || setgid(kNobody) != 0 || setuid(kNobody) != 0) return 1;
+        return database.Run("CREATE TABLE item (name); INSERT INTO item VALUES ('a')") == 0 ? 0 : 2;
+      }),
+      0);
+  EXPECT_EQ(RawDatabase(path).Value("SELECT name FROM item"), "a");
 }
 
 TEST_F(VelkDb, AFileThatMayOnlyBeReadIsReadAndNotWritten) {

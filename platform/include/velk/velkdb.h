@@ -34,8 +34,9 @@ typedef struct DBResult_tag DBResult;          ///< The rows of one executed sta
 /// The file is never created, and not followed when its last component is a symbolic link.
 /// A file that may only be read is opened for reading. Each statement waits up to 10 seconds in
 /// all for other processes. The connection distrusts the schema (defensive mode on, trusted schema
-/// off) and keeps `synchronous=NORMAL`. An existing WAL is opened here already, as the account that
-/// the process now has. A file that is broken is connected to; its statements fail.
+/// off) and keeps `synchronous=NORMAL`. An empty file is switched to WAL. A WAL is opened here
+/// already, as the account that the process now has, so that the process may change to one that
+/// could not. A file that is broken is connected to; its statements fail.
 ///
 /// Durability. In WAL mode a committed change survives the death of the process at once. It has
 /// also reached the disk when VELKDBExecute() returns, unless all that its transaction wrote were
