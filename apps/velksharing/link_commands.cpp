@@ -131,7 +131,7 @@ void AddShow(CLI::App &group, Request &request) {
 struct ListOptions {
   TextOption project, owner;
   std::string state;
-  LinkOrder order = BY_ID;
+  std::string order = "id";
   bool descending = false;
   PageOptions page;
 };
@@ -152,7 +152,7 @@ LinkQuery ToQuery(const ListOptions &options) {
   query.project = options.project.value();
   if (options.owner.given()) query.owner_uid = ResolveAccount(*options.owner.value());
   query.state = LinkStateFromName(options.state);
-  query.order = options.order;
+  query.order = ORDERS.at(options.order);
   query.descending = options.descending;
   query.page = options.page.ToPage();
   return query;
@@ -193,8 +193,6 @@ void AddList(CLI::App &group, Request &request) {
   command->add_option("--state", options->state, "Only links in this state")
       ->check(CLI::IsMember({"active", "pending", "used-up", "expired", "disabled"}));
   command->add_option("--sort", options->order, "Order by this field; id when not given")
-      ->type_name("FIELD")
-      ->transform(CLI::Transformer(ORDERS))
       ->check(CLI::IsMember(ORDERS));
   command->add_flag("--desc", options->descending, "Largest first");
   options->page.AddTo(*command);
