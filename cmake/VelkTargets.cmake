@@ -10,6 +10,10 @@ target_compile_options(velk_flags INTERFACE -Wall -Wextra -Wpedantic -Wshadow
   $<$<COMPILE_LANGUAGE:CXX>:-Wnon-virtual-dtor>
   -fvisibility=hidden $<$<COMPILE_LANGUAGE:CXX>:-fvisibility-inlines-hidden>
   $<$<BOOL:${VELK_WARNINGS_ARE_ERRORS}>:-Werror>)
+# GCC 12 gives false alarms for "text" + string when it optimizes.
+if(CMAKE_CXX_COMPILER_ID STREQUAL GNU AND CMAKE_CXX_COMPILER_VERSION VERSION_LESS 13)
+  target_compile_options(velk_flags INTERFACE $<$<COMPILE_LANGUAGE:CXX>:-Wno-restrict>)
+endif()
 
 # Targets that know where things live.
 add_library(velk_paths INTERFACE)
