@@ -1,5 +1,7 @@
 #include "velksharing/record.h"
 
+#include <climits>
+
 #include "entry_private.h"
 
 namespace VELK {
@@ -146,7 +148,7 @@ Entry &Entry::set_use_count(const int &use_count) {
 }
 
 Entry &Entry::inc_use_count() {
-  ++private_->use_count_;
+  if (private_->use_count_ < INT_MAX) ++private_->use_count_;
   return *this;
 }
 
