@@ -17,7 +17,8 @@ using VELK::sharing::db::SharingDB;
 SharingDB &SharingDatabase();
 
 /// A connection to the existing sharing database that can change nothing in it: a missing file is
-/// not made, an old schema not brought up to date, and every writing statement fails.
+/// not made, an old schema not brought up to date, and every writing statement fails. Changes that
+/// others had committed to the log may still move into the file when the last connection closes.
 /// @throws Failure DATABASE.
 std::unique_ptr<BaseDB> OpenForReading();
 
