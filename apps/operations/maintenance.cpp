@@ -5,6 +5,7 @@
 #include "operations/moment.h"
 #include "velksharing/constants.h"
 #include "velksharing/record.h"
+#include "velksharing/utils.h"
 
 namespace operations {
 namespace {
@@ -32,8 +33,10 @@ std::vector<std::string> IntegrityProblems(BaseDB &db) {
     return {"the check itself failed: " + db.GetLastError()};
   std::vector<std::string> problems;
   for (Row row; result.NextRow(row);) {
-    const std::string line = row.GetField("integrity_check").AsString("");
-    if (line != "ok") problems.push_back(line);
+    const std::string text = row.GetField("integrity_check").AsString("");
+    std::vector<std::string> lines;
+    if (text != "ok" && StringExplode(lines, text, "\n"))
+      problems.insert(problems.end(), lines.begin(), lines.end());
   }
   return problems;
 }

@@ -92,7 +92,7 @@ TEST_F(CliDb, CheckSurvivesEveryKindOfHostileRow) {
 }
 
 TEST_F(CliDb, CheckFindsADamagedFile) {
-  const std::string hash = MakeLink();
+  MakeLink();
   {
     RawDatabase raw(SharingDatabasePath());
     raw.Run("PRAGMA writable_schema = ON");
@@ -101,7 +101,9 @@ TEST_F(CliDb, CheckFindsADamagedFile) {
         "'session') WHERE name = 'token'");
   }
   const Outcome outcome = Run({"db", "check"});
-  EXPECT_EQ(3, outcome.status) << outcome.out << outcome.err;
+  EXPECT_EQ(3, outcome.status) << outcome.err;
+  EXPECT_THAT(outcome.out, HasSubstr("damage: 2nd reference to page"));
+  EXPECT_THAT(outcome.out, HasSubstr("the file is damaged\n"));
 }
 
 TEST_F(CliDb, VacuumGivesRoomBack) {
