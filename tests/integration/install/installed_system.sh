@@ -98,8 +98,7 @@ login() {
 # What the log has of LINE (an extended regular expression); waits, for it comes by itself.
 # usage: logged LINE
 logged() {
-  local try
-  for try in {1..40}; do
+  for _ in {1..40}; do
     if grep -qE -- "$1" "$log"; then
       echo yes
       return
