@@ -90,7 +90,10 @@ Entry CreateLink(BaseDB &db, const LinkChange &change) {
   Apply(change, link);
   link.set_hash("to be drawn");
   RefuseIllegal(link);
+  // The store takes every failed insert for a collision and tries again: wait for others here.
+  Transaction transaction(db, Transaction::WRITE);
   if (!EntryDB(db).CreateWithHash(link)) throw DatabaseFailure(db, "the link could not be stored");
+  transaction.Commit();
   return link;
 }
 
