@@ -21,6 +21,18 @@ target_compile_definitions(velk_paths INTERFACE
   VELK_ROOT="${VELK_ROOT}" VELK_SYSTEM_UID=${VELK_SYSTEM_UID} VELK_SYSTEM_GID=${VELK_SYSTEM_GID}
   VELK_SASLAUTHD_SOCKET="${VELK_SASLAUTHD_SOCKET}")
 
+# velk_shared_library(NAME MAP): what all our shared libraries have in common. The version map
+# decides what leaves the library, and whatever it needs must be named.
+function(velk_shared_library name map)
+  # Clang's sanitizers leave their own symbols to the program.
+  if(NOT (CMAKE_CXX_COMPILER_ID STREQUAL Clang AND CMAKE_CXX_FLAGS MATCHES -fsanitize))
+    target_link_options(${name} PRIVATE -Wl,--no-undefined)
+  endif()
+  target_link_options(${name} PRIVATE -Wl,--version-script=${map} -Wl,-z,relro -Wl,-z,now)
+  set_target_properties(${name} PROPERTIES INSTALL_RPATH "$ORIGIN" LINK_DEPENDS ${map})
+  install(TARGETS ${name} EXPORT velksharing-targets LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+endfunction()
+
 # velk_platform_library(NAME SOURCES ... [LIBRARIES ...]): one shared library of the platform,
 # which exports what its header under velk/ marks and nothing else.
 function(velk_platform_library name)
@@ -31,10 +43,6 @@ function(velk_platform_library name)
     $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
   target_link_libraries(${name} PRIVATE $<BUILD_INTERFACE:velk_flags>
                         $<BUILD_INTERFACE:velk_paths> ${arg_LIBRARIES})
-  target_link_options(${name} PRIVATE
-    -Wl,--version-script=${PROJECT_SOURCE_DIR}/platform/exports.map
-    -Wl,--no-undefined -Wl,-z,relro -Wl,-z,now)
-  set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1 INSTALL_RPATH "$ORIGIN"
-    LINK_DEPENDS ${PROJECT_SOURCE_DIR}/platform/exports.map)
-  install(TARGETS ${name} EXPORT velksharing-targets LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR})
+  set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1)
+  velk_shared_library(${name} ${PROJECT_SOURCE_DIR}/platform/exports.map)
 endfunction()

@@ -4,6 +4,7 @@
 
 #include "internal/log.h"
 #include "internal/platform_ptr.h"
+#include "internal/secret_text.h"
 #include "record/entry_private.h"
 #include "velksharing/access.h"
 #include "velksharing/constants.h"
@@ -20,6 +21,8 @@ using sharing::db::SharingDB;
 using sharing::db::TokenDB;
 using sharing::internal::CgiPtr;
 using sharing::internal::LogErrorWithoutPid;
+using sharing::internal::Origin;
+using sharing::internal::SecretText;
 using sharing::internal::UserPtr;
 using sharing::record::Entry;
 using sharing::record::EntryPrivate;
@@ -32,9 +35,9 @@ constexpr long kLifetimeSeconds = 86400;
 constexpr int kDone = 1;
 constexpr int kNotDone = 0;
 
-/// What the check of an account gives. The values are those of VelkSharingAuthResult.
+/// What the check of an account has come to. The values are those of VelkSharingAuthResult.
 enum AccountCheck {
-  kPermitted = VELK_SHARING_AUTH_OK,
+  kAccepted = VELK_SHARING_AUTH_OK,
   kWrongCredentials = VELK_SHARING_AUTH_REFUSED,
   kNotCheckable = VELK_SHARING_AUTH_UNUSABLE,
   kNotPermitted = VELK_SHARING_AUTH_LINK_INVALID
@@ -73,14 +76,14 @@ AccountCheck FindAccount(VelkCgi *cgi, const _tag_sharing_login_params *params, 
   if (params->username == nullptr) {
     const int answer = VELKUserGetByUID(uid, &found);
     user.reset(found);
-    return answer == 0 && sharing::UserGroupsGet(user.get(), gids) ? kPermitted : kNotCheckable;
+    return answer == 0 && sharing::UserGroupsGet(user.get(), gids) ? kAccepted : kNotCheckable;
   }
   if (!PlatformLogin(cgi, params)) return kWrongCredentials;
   const bool known = sharing::UserGet(params->username, found);
   user.reset(found);
   if (!known || !sharing::UserGroupsGet(user.get(), gids)) return kNotCheckable;
   uid = user->uid;
-  return kPermitted;
+  return kAccepted;
 }
 
 /// Whether the link permits the account by its stored ids. Names that had no id when they were set
@@ -99,17 +102,17 @@ AccountCheck LoginProtectUser(const Entry &entry, const _tag_sharing_login_param
                               unsigned int &uid_io) {
   VelkCgi *context = nullptr;
   const bool has_context = VelkCgiInit(&context, "") == 1;
+  UserPtr user;
   const CgiPtr cgi(context);
   if (!has_context) return kNotCheckable;
   VelkCgiLoadInCookies(cgi.get());
   if (!TakeOverPlatformSession(cgi.get())) return kNotCheckable;
 
-  UserPtr user;
   std::set<unsigned int> gids;
   const AccountCheck found = FindAccount(cgi.get(), params, uid_io, user, gids);
-  if (found != kPermitted) return found;
+  if (found != kAccepted) return found;
   const auto &stored = static_cast<const EntryPrivate &>(entry.GetCObject());
-  return IsPermitted(stored, user->uid, gids) ? kPermitted : kNotPermitted;
+  return IsPermitted(stored, user->uid, gids) ? kAccepted : kNotPermitted;
 }
 
 int RefuseAndCount(const std::string &ip, VelkSharingLoginResult result) {
@@ -120,14 +123,15 @@ int RefuseAndCount(const std::string &ip, VelkSharingLoginResult result) {
 int CheckPassword(const Entry &entry, const _tag_sharing_login_params *params,
                   const std::string &ip) {
   if (params->password == nullptr) return RefuseAndCount(ip, VELK_SHARING_LOGIN_REFUSED);
-  if (entry.IsPasswordValid(params->password)) return VELK_SHARING_LOGIN_OK;
+  const SecretText password{params->password};
+  if (entry.IsPasswordValid(password.text())) return VELK_SHARING_LOGIN_OK;
   return RefuseAndCount(ip, VELK_SHARING_LOGIN_WRONG_PASSWORD);
 }
 
 int CheckAccount(const Entry &entry, const _tag_sharing_login_params *params, bool keep_block_state,
                  const std::string &ip, unsigned int &uid) {
   switch (LoginProtectUser(entry, params, uid)) {
-    case kPermitted:
+    case kAccepted:
       return VELK_SHARING_LOGIN_OK;
     case kNotPermitted:
       if (keep_block_state) return VELK_SHARING_LOGIN_NOT_PERMITTED;
@@ -189,6 +193,12 @@ bool LetIn(TokenDB &tokens, const Entry &entry, const _tag_sharing_login_params 
   return sessions.Update(session);
 }
 
+/// Logs why a call ends here, and ends it.
+int LogAndReturn(Origin origin, const char *format, int result) {
+  LogErrorWithoutPid(origin, format);
+  return result;
+}
+
 }  // namespace
 
 int VelkSharingLogin(std::string &session_id_out, const _tag_sharing_login_params *params,
@@ -231,16 +241,6 @@ int VelkSharingLogin(std::string &session_id_out, const _tag_sharing_login_param
   return VELK_SHARING_LOGIN_OK;
 }
 
-namespace {
-
-/// Logs why a visitor is not authorised.
-int NotAuthorized(sharing::internal::Origin origin, const char *format, int result) {
-  LogErrorWithoutPid(origin, format);
-  return result;
-}
-
-}  // namespace
-
 int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
   SharingDB &database = SharingDB::Instance();
   SessionDB sessions(database);
@@ -252,13 +252,13 @@ int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
   std::string ip;
 
   if (!database.IsGood()) {
-    return NotAuthorized(kSource, "%s:%d db is not good", VELK_SHARING_AUTH_UNUSABLE);
+    return LogAndReturn(kSource, "%s:%d db is not good", VELK_SHARING_AUTH_UNUSABLE);
   }
   if (params == nullptr || params->session_id == nullptr || params->hash == nullptr) {
     return VELK_SHARING_AUTH_UNUSABLE;
   }
   if (!GetRemoteIP(ip)) {
-    return NotAuthorized(kSource, "%s:%d invalid ip", VELK_SHARING_AUTH_UNUSABLE);
+    return LogAndReturn(kSource, "%s:%d invalid ip", VELK_SHARING_AUTH_UNUSABLE);
   }
 
   if (!sessions.GetBySessionId(params->session_id, session)) return VELK_SHARING_AUTH_NO_SESSION;
@@ -266,21 +266,21 @@ int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
   if (!tokens.GetBySessionEntry(session, entry, token)) return VELK_SHARING_AUTH_NO_GRANT;
 
   if (!entry.IsValid()) {
-    return NotAuthorized(kSource, "%s:%d entry is not valid", VELK_SHARING_AUTH_LINK_INVALID);
+    return LogAndReturn(kSource, "%s:%d entry is not valid", VELK_SHARING_AUTH_LINK_INVALID);
   }
   if (!session.IsLegal()) {
-    return NotAuthorized(kSource, "%s:%d session is not valid", VELK_SHARING_AUTH_LAPSED);
+    return LogAndReturn(kSource, "%s:%d session is not valid", VELK_SHARING_AUTH_LAPSED);
   }
   if (!token.IsLegal()) {
     LogErrorWithoutPid(kSource, "%s:%d token is not valid");
     if (tokens.Delete(token)) return VELK_SHARING_AUTH_LAPSED;
-    return NotAuthorized(kSource, "%s:%d delete token failed", VELK_SHARING_AUTH_UNUSABLE);
+    return LogAndReturn(kSource, "%s:%d delete token failed", VELK_SHARING_AUTH_UNUSABLE);
   }
 
   if (entry.get_protect_type() == Entry::PROTECT_USER) {
     unsigned int uid = session.get_uid();
     const int checked = LoginProtectUser(entry, params, uid);
-    if (checked != kPermitted) return NotAuthorized(kSource, "%s:%d user login error", checked);
+    if (checked != kAccepted) return LogAndReturn(kSource, "%s:%d user login error", checked);
   }
   if (entry.get_enable_match_ip() && ip != session.get_ip()) {
     LogErrorWithoutPid(kSource, "%s:%d ip not match, %s, %s", ip.c_str(), session.get_ip().c_str());
@@ -289,11 +289,11 @@ int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
 
   session.set_timeout(EndOfLifetime());
   if (!sessions.Update(session)) {
-    return NotAuthorized(kSource, "%s:%d update session failed", VELK_SHARING_AUTH_UNUSABLE);
+    return LogAndReturn(kSource, "%s:%d update session failed", VELK_SHARING_AUTH_UNUSABLE);
   }
   token.set_timeout(EndOfLifetime());
   if (!tokens.Update(token)) {
-    return NotAuthorized(kSource, "%s:%d update token failed", VELK_SHARING_AUTH_UNUSABLE);
+    return LogAndReturn(kSource, "%s:%d update token failed", VELK_SHARING_AUTH_UNUSABLE);
   }
   return VELK_SHARING_AUTH_OK;
 }
@@ -309,13 +309,13 @@ int VelkSharingLogout(const std::string &hash, const std::string &session_id) {
 
   if (!database.IsGood()) return kNotDone;
   if (!sessions.GetBySessionId(session_id, session)) {
-    return NotAuthorized(kSource, "%s:%d get session failed", kNotDone);
+    return LogAndReturn(kSource, "%s:%d get session failed", kNotDone);
   }
   if (!entries.GetByHash(hash, entry)) {
-    return NotAuthorized(kSource, "%s:%d get entry failed", kNotDone);
+    return LogAndReturn(kSource, "%s:%d get entry failed", kNotDone);
   }
   if (!tokens.GetBySessionEntry(session, entry, token)) {
-    return NotAuthorized(kSource, "%s:%d get token failed", kNotDone);
+    return LogAndReturn(kSource, "%s:%d get token failed", kNotDone);
   }
   return tokens.Delete(token) ? kDone : kNotDone;
 }

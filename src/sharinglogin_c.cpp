@@ -19,13 +19,13 @@ int NoThrow(int failure, Call call) noexcept {
 int VelkSharingLogin(char *session_id_buf, size_t buf_size,
                      const struct _tag_sharing_login_params *params, int keep_block_state) {
   if (session_id_buf == nullptr || buf_size == 0) return VELK_SHARING_LOGIN_UNUSABLE;
-  return NoThrow(VELK_SHARING_LOGIN_UNUSABLE, [&] {
-    std::string session_id;
-    const int result = VELK::VelkSharingLogin(session_id, params, keep_block_state == 1);
-    session_id.copy(session_id_buf, buf_size);
-    session_id_buf[buf_size - 1] = '\0';
-    return result;
+  std::string session_id;
+  const int result = NoThrow(VELK_SHARING_LOGIN_UNUSABLE, [&] {
+    return VELK::VelkSharingLogin(session_id, params, keep_block_state == 1);
   });
+  session_id.copy(session_id_buf, buf_size);
+  session_id_buf[buf_size - 1] = '\0';
+  return result;
 }
 
 int VelkSharingIsAuthorized(const struct _tag_sharing_login_params *params) {

@@ -1,8 +1,10 @@
 #ifndef VELKSHARING_INTERNAL_FIELD_MAP_H
 #define VELKSHARING_INTERNAL_FIELD_MAP_H
 
+#include <cstddef>
 #include <map>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace VELK::sharing::internal {
@@ -11,7 +13,7 @@ namespace VELK::sharing::internal {
 template <typename Names>
 std::map<std::string, std::string> FieldMap(const Names &names, std::vector<std::string> values) {
   std::map<std::string, std::string> map;
-  size_t i = 0;
+  std::size_t i = 0;
   for (const char *name : names) map.emplace(name, std::move(values[i++]));
   return map;
 }

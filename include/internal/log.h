@@ -4,8 +4,6 @@
 #include <syslog.h>
 #include <unistd.h>
 
-#include <source_location>
-
 /// The library's messages in the system log. Each spells its whole format out, prefix and newlines
 /// included, because these differ from layer to layer and log readers match them to the letter.
 
@@ -14,9 +12,8 @@ namespace VELK::sharing::internal {
 /// The place that a message names: a source's name and the line of the call, or a given line where
 /// that is part of the message.
 struct Origin {
-  Origin(const char *source_name, std::source_location here = std::source_location::current())
-      : source(source_name), line(static_cast<int>(here.line())) {}
-  Origin(const char *source_name, int fixed_line) : source(source_name), line(fixed_line) {}
+  Origin(const char *source_name, int at_line = __builtin_LINE())
+      : source(source_name), line(at_line) {}
 
   const char *source;
   int line;

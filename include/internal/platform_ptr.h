@@ -4,6 +4,7 @@
 #include <memory>
 
 #include "velk/velkcgi.h"
+#include "velk/velkdb.h"
 #include "velk/velksdk.h"
 
 /// Owners of what the platform hands out, freed by the platform's own calls.
@@ -18,6 +19,7 @@ struct PlatformDeleter {
   }
 };
 
+using DatabasePtr = std::unique_ptr<VELKDBHandle, PlatformDeleter<VELKDBClose>>;
 using UserPtr = std::unique_ptr<VELKUSER, PlatformDeleter<VELKUserFree>>;
 using GroupPtr = std::unique_ptr<VELKGROUP, PlatformDeleter<VELKGroupFree>>;
 using TextListPtr = std::unique_ptr<VLIBCSzHash, PlatformDeleter<VLIBCSzHashFree>>;

@@ -8,8 +8,9 @@
 namespace VELK::sharing::internal {
 
 /// Switches the effective user and group of the process while it lives, and switches back at the
-/// end of the scope, whatever the start achieved. Failures of either are logged. The ids belong to
-/// the whole process: no other thread may depend on them meanwhile.
+/// end of the scope, whatever the start achieved, and leaves errno as it was then. Failures of
+/// either are logged. The ids belong to the whole process: no other thread may depend on them
+/// meanwhile.
 class RunAsGuard {
  public:
   RunAsGuard(uid_t uid, gid_t gid, Origin origin);
@@ -21,6 +22,8 @@ class RunAsGuard {
   bool switched() const { return switched_; }
 
  private:
+  void LogRestoreFailure() const;
+
   const uid_t saved_uid_;
   const gid_t saved_gid_;
   const Origin origin_;

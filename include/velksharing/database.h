@@ -125,7 +125,8 @@ class VELK_EXPORT BaseDB {
   bool IsGood() const;  ///< Connected and set up.
 
   /// Runs the statements of `sql`.
-  /// @param result receives the rows, when given; must be fresh. Without rows it is not good.
+  /// @param result receives the rows, when given; must be fresh. Not good after a failure and
+  ///        after statements that yield no columns; one that selects no row is good.
   /// @return false when a statement failed; GetLastError() tells why.
   bool Execute(const std::string &sql, Result *result = nullptr);
   bool Execute(const std::string &sql, Result &result);

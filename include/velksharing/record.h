@@ -66,19 +66,19 @@ class VELK_EXPORT Object {
 class VELK_EXPORT Entry {
  public:
   /// What a visitor must show.
-  enum ProtectType {
+  enum ProtectType : int {
     PROTECT_NONE = 0,      ///< Nothing.
     PROTECT_PASSWORD = 1,  ///< The link's password.
     PROTECT_USER = 2       ///< An account that is permitted itself or through a group.
   };
   /// Where a visitor is sent.
-  enum RedirectType {
+  enum RedirectType : int {
     REDIRECT_NONE = 0,      ///< Nowhere.
     REDIRECT_URLPARAM = 1,  ///< The page gets the target as a URL parameter.
     REDIRECT_ALWAYS = 2     ///< To the target.
   };
   /// How the link's password is kept. Any other value counts as ENCRYPT_ALGO_MD5.
-  enum PasswordEncryptAlgo {
+  enum PasswordEncryptAlgo : int {
     ENCRYPT_ALGO_DEFAULT = 0,  ///< Salted SHA-1.
     ENCRYPT_ALGO_MD5 = 1       ///< Unsalted MD5, for digests taken over from elsewhere.
   };
@@ -117,8 +117,8 @@ class VELK_EXPORT Entry {
   void ToJSON(Json::Value &out) const;
 
   /// @return false when the row's data is no JSON object of the expected form, or the link is not
-  ///         legal. Texts of a kind that is not known load as the strictest: protection by
-  ///         account, MD5, always redirect.
+  ///         legal. Texts of a kind that is not known load as protection by account, as MD5, as
+  ///         redirecting always.
   bool FromRow(const db::Row &row);
 
   int get_id() const;
@@ -132,6 +132,7 @@ class VELK_EXPORT Entry {
   std::string get_project_name() const;
   Entry &set_project_name(const std::string &project_name);
 
+  /// Whether the link is switched on.
   bool get_enabled() const;
   Entry &set_enabled(const bool &enabled);
 
@@ -162,12 +163,14 @@ class VELK_EXPORT Entry {
 
   /// Number of uses allowed; 0 or less: any number.
   int get_expire_times() const;
-  /// Going from 0 to a limit starts the use count anew; any other change keeps it.
+  /// Going from 0 to any other number starts the use count anew; every other change keeps it.
   Entry &set_expire_times(const int &expire_times);
 
+  /// Uses so far.
   int get_use_count() const;
   Entry &set_use_count(const int &use_count);
-  /// Adds one to the use count of this record; storing it is the caller's.
+  /// Adds one to the use count of this record, whatever the limit (only the largest number there
+  /// is stays as it is); storing it is the caller's.
   Entry &inc_use_count();
 
   /// Whether the link may be purged automatically once it has expired.
@@ -178,6 +181,7 @@ class VELK_EXPORT Entry {
   bool get_enable_match_ip() const;
   Entry &set_enable_match_ip(bool enable_match_ip);
 
+  /// What a visitor must show.
   Entry::ProtectType get_protect_type() const;
   Entry &set_protect_type(Entry::ProtectType protect_type);
 
@@ -210,15 +214,17 @@ class VELK_EXPORT Entry {
   std::vector<std::string> get_protect_groups() const;
   Entry &set_protect_groups(const std::vector<std::string> &names);
 
+  /// Where a visitor is sent, and the target. The library only keeps them.
   Entry::RedirectType get_redirect_type() const;
   Entry &set_redirect_type(Entry::RedirectType redirect_type);
   std::string get_redirect_uri() const;
   Entry &set_redirect_uri(const std::string &redirect_uri);
 
-  /// The application's data, shown to front ends; must become an object.
+  /// The application's data, shown to front ends; must become an object. A link whose data cannot
+  /// be read back is stored, but never loaded: at most 990 levels deep, no infinite numbers.
   Json::Value get_app() const;
   Entry &set_app(const Json::Value &app);
-  /// The application's data that front ends do not see; an object.
+  /// The application's data that front ends do not see; an object, with the same limits.
   Json::Value get_private_data() const;
   Entry &set_private_data(const Json::Value &private_data);
 
@@ -243,7 +249,8 @@ class VELK_EXPORT Session {
   std::map<std::string, std::string> GetFieldMap() const;
   /// Whether identifier and address are set and the session has not lapsed.
   bool IsLegal() const;
-  /// Sets the members of the stored columns; others of `out` stay. Holds the identifier: a secret.
+  /// Sets the members of the stored columns; others of `out` stay, unless it is no object. Holds
+  /// the identifier: a secret.
   void ToJSON(Json::Value &out) const;
   /// @return IsLegal(); a lapsed session is loaded in full all the same.
   bool FromRow(const db::Row &row);
@@ -284,7 +291,7 @@ class VELK_EXPORT Token {
   std::map<std::string, std::string> GetFieldMap() const;
   /// Whether link and session are set and the grant has not lapsed.
   bool IsLegal() const;
-  /// Sets the members of the stored columns; others of `out` stay.
+  /// Sets the members of the stored columns; others of `out` stay, unless it is no object.
   void ToJSON(Json::Value &out) const;
   /// @return IsLegal(); a lapsed grant is loaded in full all the same.
   bool FromRow(const db::Row &row);

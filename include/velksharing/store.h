@@ -63,11 +63,15 @@ class VELK_EXPORT ObjectDB {
   bool Query(std::vector<T> &out) const;
 
  protected:
-  /// @param table the table's name; must live as long as the store.
+  /// @param table the table's name. Without one (null) every statement fails.
   ObjectDB(BaseDB &db, const char *table);
 
+  /// Runs a statement and loads its first row; false when it fails, gives no row, or gives one
+  /// that cannot be used.
+  bool LoadFirst(const std::string &sql, record::Object &obj) const;
+
   BaseDB &GetDB() const;
-  std::string GetTable() const;
+  const std::string &GetTable() const;
 
  private:
   std::unique_ptr<ObjectDBPrivate> private_;
@@ -86,18 +90,24 @@ class VELK_EXPORT EntryDB {
   /// Inserts a link under a fresh random hash of SHARING_HASH_LENGTH letters and digits. Tries up
   /// to 51 times, one character longer after every third try; the link keeps the last hash tried.
   bool CreateWithHash(record::Entry &entry);
+  /// Writes all columns of a stored link. Refuses one that is not legal.
   bool Update(const record::Entry &entry);
+  /// Deletes a row; one that does not exist is no failure.
   bool Delete(int id);
   bool Delete(const record::Entry &entry);
 
+  /// False when there is no such row or it cannot be used.
   bool GetById(int id, record::Entry &entry) const;
   /// The link of a grant.
   bool GetByToken(const record::Token &token, record::Entry &entry) const;
   /// False for an unknown hash, with `entry` left alone, and for a link that cannot be used.
   bool GetByHash(const std::string &hash, record::Entry &entry) const;
 
+  /// Counts the rows that the condition admits, and clears it.
   bool Count(int &count) const;
+  /// The filter, order and page of the next Count() or Query().
   Condition &GetCondition() const;
+  /// Loads the rows that the condition admits and that can be used, and clears it.
   bool Query(std::vector<record::Entry> &entries) const;
 
   /// Deletes every link of one owner.
@@ -127,13 +137,19 @@ class VELK_EXPORT SessionDB {
   /// Inserts a session under a fresh random identifier of SHARING_SESSION_LENGTH characters that
   /// need no escaping in a URL. Tries up to 51 times; the session keeps the last one tried.
   bool CreateWithSessionId(record::Session &session);
+  /// Writes all columns of a stored session. Refuses one that is not legal.
   bool Update(const record::Session &session);
+  /// Deletes a row; one that does not exist is no failure.
   bool Delete(int id);
   bool Delete(const record::Session &session);
 
+  /// False when there is no such row or it cannot be used.
   bool GetById(int id, record::Session &session) const;
+  /// Counts the rows that the condition admits, and clears it.
   bool Count(int &count) const;
+  /// The filter, order and page of the next Count() or Query().
   Condition &GetCondition() const;
+  /// Loads the rows that the condition admits and that can be used, and clears it.
   bool Query(std::vector<record::Session> &sessions) const;
 
   /// False for an unknown identifier, and for a lapsed session, which is loaded all the same.
@@ -155,14 +171,21 @@ class VELK_EXPORT TokenDB {
   TokenDB &operator=(const TokenDB &) = delete;
   virtual ~TokenDB();
 
+  /// Inserts a grant. Refuses one that is not legal.
   bool Create(record::Token &token);
+  /// Writes all columns of a stored grant. Refuses one that is not legal.
   bool Update(const record::Token &token);
+  /// Deletes a row; one that does not exist is no failure.
   bool Delete(int id);
   bool Delete(const record::Token &token);
 
+  /// False when there is no such row or it cannot be used.
   bool GetById(int id, record::Token &token) const;
+  /// Counts the rows that the condition admits, and clears it.
   bool Count(int &count) const;
+  /// The filter, order and page of the next Count() or Query().
   Condition &GetCondition() const;
+  /// Loads the rows that the condition admits and that can be used, and clears it.
   bool Query(std::vector<record::Token> &tokens) const;
 
   /// The grant of one stored session on one stored link. False when there is none, and for a

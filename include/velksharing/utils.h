@@ -10,6 +10,11 @@
 /// Text forms of values, password digests, chance, splitting of texts, and the translation
 /// between names and ids of accounts and groups. Free functions; every one may be called from any
 /// thread.
+///
+///     std::string digest;
+///     bool done = Sha1WithSaltHashPassword("open sesame", "x7Gq2L", digest);
+///     unsigned int uid;
+///     if (UserToUID(" Ann ", uid) && IsProbabilityHit(0.01f)) purge();
 
 struct VELKUSER_tag;
 typedef struct VELKUSER_tag VELKUSER;  ///< The platform's account record (velk/velksdk.h).

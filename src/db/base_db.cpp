@@ -1,9 +1,9 @@
 #include <sqlite3.h>
 
 #include "internal/log.h"
+#include "internal/platform_ptr.h"
 #include "internal/run_as.h"
 #include "velk/velkcore.h"
-#include "velk/velkdb.h"
 #include "velksharing/constants.h"
 #include "velksharing/database.h"
 
@@ -12,6 +12,7 @@ namespace sharing {
 namespace db {
 namespace {
 
+using internal::DatabasePtr;
 using internal::kSystemGid;
 using internal::kSystemUid;
 using internal::LogError;
@@ -28,9 +29,7 @@ class BaseDBPrivate {
   }
   BaseDBPrivate(const BaseDBPrivate &) = delete;
   BaseDBPrivate &operator=(const BaseDBPrivate &) = delete;
-  ~BaseDBPrivate() {
-    if (handle_ != nullptr) VELKDBClose(handle_);
-  }
+  ~BaseDBPrivate() = default;
 
   bool IsGood() const { return handle_ != nullptr && good_; }
 
@@ -50,7 +49,7 @@ class BaseDBPrivate {
 
   bool GetLastInsertId(int &id) const {
     if (!IsGood()) return false;
-    id = static_cast<int>(sqlite3_last_insert_rowid(VELKDBSqlite(handle_)));
+    id = static_cast<int>(sqlite3_last_insert_rowid(VELKDBSqlite(handle_.get())));
     return true;
   }
 
@@ -98,7 +97,7 @@ class BaseDBPrivate {
         LogError(kSource, "%s:%d (%u) failed to run as system\n\n");
         return false;
       }
-      handle_ = VELKDBConnect("", "", "", path_.c_str());
+      handle_.reset(VELKDBConnect("", "", "", path_.c_str()));
     }
     if (handle_ == nullptr) LogError(kSource, "%s:%d (%u) db connect failed\n\n");
     return handle_ != nullptr;
@@ -117,14 +116,14 @@ class BaseDBPrivate {
       return false;
     }
     last_query_ = sql;
-    if (VELKDBExecute(handle_, sql.c_str(), &rows) != -1) return true;
-    last_error_ = VELKDBErrorGet(handle_);
+    if (VELKDBExecute(handle_.get(), sql.c_str(), &rows) != -1) return true;
+    last_error_ = VELKDBErrorGet(handle_.get());
     return false;
   }
 
   const std::string path_;
   bool good_ = true;  // while the constructor runs, so that it can execute statements
-  VELKDBHandle *handle_ = nullptr;
+  DatabasePtr handle_;
   std::string last_error_;
   std::string last_query_;
 };
@@ -177,10 +176,11 @@ bool BaseDB::Insert(const std::string &table, const std::vector<std::string> &va
   std::string sql = "INSERT INTO " + table + " VALUES (NULL,";
   const char *separator = "'";
   for (const std::string &value : values) {
-    sql += separator + Escape(value) + "'";
+    sql.append(separator).append(Escape(value)).append("'");
     separator = ",'";
   }
-  return Execute(sql + ")");
+  sql += ")";
+  return Execute(sql);
 }
 
 bool BaseDB::Update(const std::string &table, const std::map<std::string, std::string> &columns,
@@ -192,7 +192,8 @@ bool BaseDB::Update(const std::string &table, const std::map<std::string, std::s
     sql.append(separator).append(Escape(column)).append("='").append(Escape(value)).append("'");
     separator = ",";
   }
-  return Execute(sql + " WHERE id=" + std::to_string(id));
+  sql += " WHERE id=" + std::to_string(id);
+  return Execute(sql);
 }
 
 bool BaseDB::Delete(const std::string &table, int id) {

@@ -42,12 +42,8 @@ class EntryDBPrivate : public ObjectDB {
   }
 
   bool GetByHash(const std::string &hash, record::Entry &entry) const {
-    Result result;
-    Row row;
-    const std::string sql =
-        "SELECT * FROM " + GetTable() + " WHERE hash = '" + GetDB().Escape(hash) + "'";
-    return GetDB().Execute(sql, result) && result.IsGood() && result.NextRow(row) &&
-           entry.FromRow(row);
+    return LoadFirst("SELECT * FROM " + GetTable() + " WHERE hash = '" + GetDB().Escape(hash) + "'",
+                     entry.GetObject());
   }
 
   bool DeleteByOwnerUid(unsigned int uid) {

@@ -14,16 +14,18 @@ constexpr char kSource[] = "object_db";
 
 class ObjectDBPrivate {
  public:
-  ObjectDBPrivate(BaseDB &db, const char *table) : db_(db), table_(table), condition_(db) {}
+  ObjectDBPrivate(BaseDB &db, const char *table)
+      : db_(db), table_(table == nullptr ? "" : table), condition_(db) {}
 
   BaseDB &db() { return db_; }
-  const char *table() const { return table_; }
+  const std::string &table() const { return table_; }
   Condition &condition() { return condition_; }
 
   /// Runs "SELECT `columns` FROM" the table for the rows that the condition admits, and clears the
   /// condition, whatever the outcome.
   bool Select(const char *columns, Result &result) {
-    std::string sql = std::string("SELECT ") + columns + " FROM " + table_;
+    std::string sql = "SELECT ";
+    sql.append(columns).append(" FROM ").append(table_);
     if (condition_.IsEmpty()) return db_.Execute(sql, result);
     sql += condition_.GetSQL();
     const bool done = db_.Execute(sql, result);
@@ -33,7 +35,7 @@ class ObjectDBPrivate {
 
  private:
   BaseDB &db_;
-  const char *const table_;
+  const std::string table_;
   Condition condition_;
 };
 
@@ -79,10 +81,7 @@ bool ObjectDB::Delete(const record::Object &obj) {
 }
 
 bool ObjectDB::GetById(int id, record::Object &obj) const {
-  Result result;
-  Row row;
-  const std::string sql = "SELECT * FROM " + GetTable() + " WHERE id = " + std::to_string(id);
-  return GetDB().Execute(sql, result) && result.NextRow(row) && obj.FromRow(row);
+  return LoadFirst("SELECT * FROM " + GetTable() + " WHERE id = " + std::to_string(id), obj);
 }
 
 bool ObjectDB::Count(int &count) const {
@@ -91,6 +90,10 @@ bool ObjectDB::Count(int &count) const {
   if (!private_->Select("COUNT(*) AS c", result) || !result.NextRow(row)) return false;
   count = row.GetField("c").AsInt(0);
   return true;
+}
+
+Condition &ObjectDB::GetCondition() const {
+  return private_->condition();
 }
 
 template <typename T>
@@ -110,15 +113,17 @@ template VELK_EXPORT bool ObjectDB::Query(std::vector<record::Entry> &out) const
 template VELK_EXPORT bool ObjectDB::Query(std::vector<record::Session> &out) const;
 template VELK_EXPORT bool ObjectDB::Query(std::vector<record::Token> &out) const;
 
-Condition &ObjectDB::GetCondition() const {
-  return private_->condition();
+bool ObjectDB::LoadFirst(const std::string &sql, record::Object &obj) const {
+  Result result;
+  Row row;
+  return GetDB().Execute(sql, result) && result.IsGood() && result.NextRow(row) && obj.FromRow(row);
 }
 
 BaseDB &ObjectDB::GetDB() const {
   return private_->db();
 }
 
-std::string ObjectDB::GetTable() const {
+const std::string &ObjectDB::GetTable() const {
   return private_->table();
 }
 

@@ -29,10 +29,7 @@ class SessionDBPrivate : public ObjectDB {
   }
 
   bool GetBySessionId(const std::string &session_id, record::Session &session) const {
-    Result result;
-    Row row;
-    return GetDB().Execute("SELECT * FROM " + WhereSessionId(session_id), result) &&
-           result.IsGood() && result.NextRow(row) && session.FromRow(row);
+    return LoadFirst("SELECT * FROM " + WhereSessionId(session_id), session.GetObject());
   }
 
   bool DeleteBySessionId(const std::string &session_id) {

@@ -14,13 +14,10 @@ class TokenDBPrivate : public ObjectDB {
 
   bool GetBySessionEntry(const record::Session &session, const record::Entry &entry,
                          record::Token &token) const {
-    Result result;
-    Row row;
-    const std::string sql = "SELECT * FROM " + GetTable() +
-                            " WHERE session_id = " + std::to_string(session.get_id()) +
-                            " AND entry_id = " + std::to_string(entry.get_id());
-    return GetDB().Execute(sql, result) && result.IsGood() && result.NextRow(row) &&
-           token.FromRow(row);
+    return LoadFirst("SELECT * FROM " + GetTable() +
+                         " WHERE session_id = " + std::to_string(session.get_id()) +
+                         " AND entry_id = " + std::to_string(entry.get_id()),
+                     token.GetObject());
   }
 
   bool PurgeByEntry(const record::Entry &entry) {

@@ -2,7 +2,7 @@
 
 #include <climits>
 
-#include "entry_private.h"
+#include "record/entry_private.h"
 
 namespace VELK {
 namespace sharing {

@@ -1,4 +1,4 @@
-#include "entry_private.h"
+#include "record/entry_private.h"
 
 #include <array>
 
@@ -14,7 +14,7 @@ namespace {
 
 using internal::JsonArray;
 
-// Kinds as texts. What is not known is written and read as the last of its kind, the strictest.
+// Kinds as texts. What is not known is written and read as the last of its kind.
 
 const char *ProtectTypeText(Entry::ProtectType type) {
   if (type == Entry::PROTECT_NONE) return SZK_PROTECT_PROTECT_NONE;
@@ -142,16 +142,17 @@ void EntryPrivate::CopyPlainFields(const EntryPrivate &other) {
 }
 
 std::vector<std::string> EntryPrivate::GetFieldList() const {
-  return {hash_,
-          project_name_,
-          ToString(enabled_),
-          std::to_string(owner_uid_),
-          ToString(start_at_),
-          ToString(expire_at_),
-          ToString(expire_times_),
-          ToString(use_count_),
-          ToString(auto_gc_),
-          internal::CompactJson(DataToJson())};
+  std::vector<std::string> list = {hash_,
+                                   project_name_,
+                                   ToString(enabled_),
+                                   std::to_string(owner_uid_),
+                                   ToString(start_at_),
+                                   ToString(expire_at_),
+                                   ToString(expire_times_),
+                                   ToString(use_count_),
+                                   ToString(auto_gc_)};
+  list.push_back(internal::CompactJson(DataToJson()));  // moved: it may be large
+  return list;
 }
 
 std::map<std::string, std::string> EntryPrivate::GetFieldMap() const {

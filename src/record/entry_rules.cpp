@@ -2,9 +2,9 @@
 
 #include <ctime>
 
-#include "entry_private.h"
 #include "internal/json.h"
 #include "internal/log.h"
+#include "record/entry_private.h"
 #include "velk/velkrandom.h"
 #include "velksharing/utils.h"
 
@@ -149,6 +149,7 @@ void EntryPrivate::set_expire_times(int expire_times) {
 
 void EntryPrivate::set_protect_password(const std::string &password, bool hash,
                                         Entry::PasswordEncryptAlgo algo) {
+  blValid_ = false;
   static RANDOM::VELKRandom random;
   std::string digest;
   if (!hash) {

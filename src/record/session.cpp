@@ -53,6 +53,7 @@ class SessionPrivate : public Object {
   }
 
   void ToJSON(Json::Value &out) const override {
+    if (!out.isObject()) out = Json::Value(Json::objectValue);
     out[SZK_SESSION_ID_] = session_id_;
     out[SZK_UID_] = uid_;
     out[SZK_IP_] = ip_;

@@ -43,6 +43,7 @@ class TokenPrivate : public Object {
   }
 
   void ToJSON(Json::Value &out) const override {
+    if (!out.isObject()) out = Json::Value(Json::objectValue);
     out[SZK_ENTRY_ID] = entry_id_;
     out[SZK_SESSION_ID_] = session_id_;
     out[SZK_TIMEOUT] = static_cast<Json::Int64>(timeout_);

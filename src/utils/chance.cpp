@@ -9,10 +9,10 @@ namespace sharing {
 
 bool IsProbabilityHit(float probability) {
   static RANDOM::VELKRandomBase source;
-  if (!(probability > 0.0f)) return false;  // not a number included
-  const int threshold = static_cast<int>(std::min(probability, 1.0f) * 100.0f);
   try {
-    return source.random(0, 99) < threshold;
+    const int draw = source.random(0, 99);
+    if (!(probability > 0.0f)) return false;  // not a number included
+    return draw < static_cast<int>(std::min(probability, 1.0f) * 100.0f);
   } catch (const std::system_error &) {  // no randomness: the work can wait for another call
     return false;
   }

@@ -1,9 +1,9 @@
 #include <gcrypt.h>
-#include <openssl/crypto.h>
 #include <openssl/md5.h>
 
 #include <new>
 
+#include "internal/secret_text.h"
 #include "velksharing/utils.h"
 
 namespace VELK {
@@ -21,30 +21,12 @@ std::string LowercaseHex(const unsigned char *bytes, size_t length) {
   return text;
 }
 
-/// A password and its salt in one piece, wiped at the end of the scope.
-class SaltedPassword {
- public:
-  SaltedPassword(const std::string &password, const std::string &salt) {
-    text_.reserve(password.size() + salt.size());  // one buffer: no copy is left behind
-    text_ += password;
-    text_ += salt;
-  }
-  SaltedPassword(const SaltedPassword &) = delete;
-  SaltedPassword &operator=(const SaltedPassword &) = delete;
-  ~SaltedPassword() { OPENSSL_cleanse(text_.data(), text_.size()); }
-
-  const std::string &text() const { return text_; }
-
- private:
-  std::string text_;
-};
-
 }  // namespace
 
 bool Sha1WithSaltHashPassword(const std::string &password, const std::string &salt,
                               std::string &out) {
   try {
-    const SaltedPassword input(password, salt);
+    const internal::SecretText input{password, salt};
     gcry_control(GCRYCTL_DISABLE_SECMEM, 0);
     gcry_control(GCRYCTL_INITIALIZATION_FINISHED, 0);
     std::string digest(gcry_md_get_algo_dlen(GCRY_MD_SHA1), '\0');

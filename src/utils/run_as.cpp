@@ -1,5 +1,7 @@
 #include "internal/run_as.h"
 
+#include <cerrno>
+
 namespace VELK::sharing::internal {
 namespace {
 
@@ -52,7 +54,12 @@ RunAsGuard::RunAsGuard(uid_t uid, gid_t gid, Origin origin)
 }
 
 RunAsGuard::~RunAsGuard() {
-  if (Restore(saved_uid_, saved_gid_)) return;
+  const int callers_errno = errno;
+  if (!Restore(saved_uid_, saved_gid_)) LogRestoreFailure();
+  errno = callers_errno;
+}
+
+void RunAsGuard::LogRestoreFailure() const {
   syslog(LOG_AUTH | LOG_CRIT, "%s:%d ERROR: ~%s(%d, %d)", origin_.source, origin_.line, kGuardName,
          static_cast<int>(saved_uid_), static_cast<int>(saved_gid_));
 }

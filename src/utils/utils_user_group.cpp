@@ -25,6 +25,11 @@ void CopyName(NameBuffer &to, const char *from) {
   std::snprintf(to.data(), to.size(), "%s", from);
 }
 
+/// Such a name is nobody's; the platform would see the part before it, which may be somebody's.
+bool HoldsZeroByte(const std::string &name) {
+  return name.find('\0') != std::string::npos;
+}
+
 /// Looks an account up and takes hold of it.
 /// @return what the platform answered.
 int FindUser(const char *name, UserPtr &user) {
@@ -72,6 +77,7 @@ bool UserGet(const char *name, VELKUSER *&user) {
 }
 
 bool UserToUID(const std::string &name, unsigned int &uid) {
+  if (HoldsZeroByte(name)) return false;
   UserPtr user;
   if (FindUser(GetRealUsername(name.c_str()).c_str(), user) != 0) return false;
   uid = user->uid;
@@ -88,7 +94,7 @@ bool UIDToUser(const unsigned int &uid, std::string &name) {
 }
 
 bool GroupToGID(const std::string &name, unsigned int &gid) {
-  return VELKGroupGetGID(name.c_str(), &gid) == 0;
+  return !HoldsZeroByte(name) && VELKGroupGetGID(name.c_str(), &gid) == 0;
 }
 
 bool GIDToGroup(const unsigned int &gid, std::string &name) {

@@ -273,6 +273,16 @@ TEST_F(ObjectDb, CountFailsWithoutARow) {
   EXPECT_EQ(77, count);
 }
 
+TEST_F(ObjectDb, FailsEveryStatementWithoutATable) {
+  PlainStore store(db_, nullptr);
+  Note note;
+  int count = 77;
+  EXPECT_FALSE(store.GetById(1, note));
+  EXPECT_FALSE(store.Count(count));
+  EXPECT_FALSE(store.Delete(1));
+  EXPECT_EQ(77, count);
+}
+
 class ObjectDbQuery : public ::testing::Test {
  protected:
   void SetUp() override {

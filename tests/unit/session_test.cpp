@@ -107,6 +107,12 @@ TEST(Session, WritesNoAccountAsAnUnsignedJsonNumber) {
   EXPECT_TRUE(json["uid"].isUInt());
 }
 
+TEST(Session, MakesAnObjectOfWhatIsNone) {
+  Json::Value json(Json::arrayValue);
+  Filled().ToJSON(json);
+  EXPECT_TRUE(json.isObject());
+}
+
 TEST(Session, LeavesOtherMembersOfTheJsonAlone) {
   Json::Value json;
   json["other"] = "kept";

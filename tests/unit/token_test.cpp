@@ -100,6 +100,12 @@ TEST(Token, WritesTimesAfter2038) {
   EXPECT_EQ(5000000000LL, json["timeout"].asInt64());
 }
 
+TEST(Token, MakesAnObjectOfWhatIsNone) {
+  Json::Value json("text");
+  TokenRecord().ToJSON(json);
+  EXPECT_TRUE(json.isObject());
+}
+
 TEST(Token, LeavesOtherMembersOfTheJsonAlone) {
   Json::Value json;
   json["other"] = "kept";

@@ -90,6 +90,12 @@ TEST(UserToUid, LeavesTheIdAloneForAnUnknownName) {
   EXPECT_TRUE(log.lines().empty());
 }
 
+TEST(UserToUid, DoesNotTakeTheStartOfANameWithAZeroByteForTheName) {
+  unsigned int uid = 77;
+  EXPECT_FALSE(UserToUID(std::string("root\0x", 6), uid));
+  EXPECT_EQ(77u, uid);
+}
+
 TEST(UidToUser, FindsTheNameOfAnAccount) {
   std::string name;
   EXPECT_TRUE(UIDToUser(0, name));
@@ -125,6 +131,12 @@ TEST(GroupToGid, LeavesTheIdAloneForAnUnknownName) {
   unsigned int gid = 77;
   EXPECT_FALSE(GroupToGID("velk-no-such-group", gid));
   EXPECT_FALSE(GroupToGID("", gid));
+  EXPECT_EQ(77u, gid);
+}
+
+TEST(GroupToGid, DoesNotTakeTheStartOfANameWithAZeroByteForTheName) {
+  unsigned int gid = 77;
+  EXPECT_FALSE(GroupToGID(std::string("root\0x", 6), gid));
   EXPECT_EQ(77u, gid);
 }
 
