@@ -18,8 +18,8 @@ using VELK::sharing::SZF_SHARING_DB_PATH;
 using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 
-constexpr const char *SCHEMA_FOLDER = VELK_ROOT "/share/velksharing/db_schema";
-constexpr int SCHEMA_VERSION = 2;
+constexpr const char *kSchemaFolder = VELK_ROOT "/share/velksharing/db_schema";
+constexpr int kSchemaVersion = 2;
 
 std::string ErrorText(int error) {
   return std::generic_category().message(error);
@@ -36,10 +36,10 @@ std::string WhyMissing() {
 }
 
 bool LooksLikeSqlite(int file) {
-  static constexpr char MAGIC[] = "SQLite format 3";
-  char head[sizeof MAGIC] = "";
+  static constexpr char kMagic[] = "SQLite format 3";
+  char head[sizeof kMagic] = "";
   const ssize_t count = pread(file, head, sizeof head, 0);
-  return count == 0 || (count == sizeof head && std::memcmp(head, MAGIC, sizeof head) == 0);
+  return count == 0 || (count == sizeof head && std::memcmp(head, kMagic, sizeof head) == 0);
 }
 
 std::string WhyUnreadable() {
@@ -62,7 +62,7 @@ std::string WhyUnusable() {
     return errno == ENOENT ? WhyMissing() : ErrorText(errno);
   const std::string unreadable = WhyUnreadable();
   if (!unreadable.empty()) return unreadable;
-  const std::string script = std::string(SCHEMA_FOLDER) + "/1.sql";
+  const std::string script = std::string(kSchemaFolder) + "/1.sql";
   if (access(script.c_str(), R_OK) != 0) return "schema script " + script + ": " + ErrorText(errno);
   return "the system log tells more";
 }
@@ -88,7 +88,7 @@ std::unique_ptr<BaseDB> OpenForReading() {
   if (!db->IsGood()) throw DatabaseUnusable();
   if (!db->Execute("PRAGMA query_only = ON")) throw Unusable(db->GetLastError());
   const long version = ReadNumber(*db, "SELECT user_version AS n FROM pragma_user_version");
-  if (version < SCHEMA_VERSION)
+  if (version < kSchemaVersion)
     throw Unusable("its schema has version " + std::to_string(version) +
                    "; a command that changes something brings it up to date");
   return db;

@@ -27,12 +27,12 @@ std::string OneLine(const std::string &report) {
 bool Parse(const std::string &text, Json::Value &value, std::string &report) {
   Json::CharReaderBuilder builder;
   Json::CharReaderBuilder::strictMode(&builder.settings_);
-  builder["stackLimit"] = JSON_DEPTH_LIMIT;
+  builder["stackLimit"] = kJsonDepthLimit;
   const std::unique_ptr<Json::CharReader> reader(builder.newCharReader());
   try {
     return reader->parse(text.data(), text.data() + text.size(), &value, &report);
   } catch (const Json::Exception &) {
-    report = "it nests deeper than " + std::to_string(JSON_DEPTH_LIMIT) + " levels";
+    report = "it nests deeper than " + std::to_string(kJsonDepthLimit) + " levels";
     return false;
   }
 }

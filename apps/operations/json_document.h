@@ -9,7 +9,7 @@ namespace operations {
 
 /// How deep a document from outside may nest. A link keeps it inside a document of its own, and
 /// what the library writes it must be able to read again.
-constexpr int JSON_DEPTH_LIMIT = 500;
+constexpr int kJsonDepthLimit = 500;
 
 /// Parses a JSON object, strictly: no comments, no trailing commas, no name twice, nothing behind
 /// it.

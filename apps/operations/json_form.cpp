@@ -145,8 +145,8 @@ Json::Value ToJson(const DatabaseStatus &status) {
   json["database_bytes"] = static_cast<Json::Int64>(status.sizes.database);
   json["log_bytes"] = static_cast<Json::Int64>(status.sizes.log);
   json["links"]["total"] = status.links;
-  for (std::size_t i = 0; i < LINK_STATES.size(); ++i)
-    json["links"][LinkStateName(LINK_STATES[i])] = status.links_by_state[i];
+  for (std::size_t i = 0; i < kLinkStates.size(); ++i)
+    json["links"][LinkStateName(kLinkStates[i])] = status.links_by_state[i];
   json["sessions"]["live"] = status.live_sessions;
   json["sessions"]["lapsed"] = status.lapsed_sessions;
   json["tokens"]["live"] = status.live_grants;

@@ -19,7 +19,7 @@ const char *LinkStateName(LinkState state) {
 }
 
 std::optional<LinkState> LinkStateFromName(const std::string &name) {
-  for (const LinkState state : LINK_STATES)
+  for (const LinkState state : kLinkStates)
     if (name == LinkStateName(state)) return state;
   return std::nullopt;
 }

@@ -19,7 +19,7 @@ enum LinkState {
   LINK_ACTIVE     ///< Lets visitors in.
 };
 
-constexpr std::array<LinkState, 5> LINK_STATES = {LINK_ACTIVE, LINK_PENDING, LINK_USED_UP,
+constexpr std::array<LinkState, 5> kLinkStates = {LINK_ACTIVE, LINK_PENDING, LINK_USED_UP,
                                                   LINK_EXPIRED, LINK_DISABLED};
 
 /// "active", "disabled", "pending", "expired" or "used-up".

@@ -15,7 +15,7 @@ using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 
 /// Rows read at a time: links may hold large documents.
-constexpr int BATCH = 100;
+constexpr int kBatch = 100;
 
 long FileSize(const std::string &path) {
   struct stat info = {};
@@ -46,7 +46,7 @@ std::vector<std::string> IntegrityProblems(BaseDB &db) {
 bool CheckNextLinks(BaseDB &db, int &id, CheckReport &report) {
   Result result;
   if (!db.Execute("SELECT * FROM entry WHERE id > " + std::to_string(id) + " ORDER BY id LIMIT " +
-                      std::to_string(BATCH),
+                      std::to_string(kBatch),
                   result))
     throw DatabaseFailure(db, "the links could not be read");
   bool any = false;
@@ -83,8 +83,8 @@ DatabaseStatus Status(BaseDB &db) {
     status.journal_mode = row.GetField("journal_mode").AsString("");
   status.sizes = DatabaseSizes();
   status.links = CountRows(db, "entry", "1");
-  for (std::size_t i = 0; i < LINK_STATES.size(); ++i)
-    status.links_by_state[i] = CountRows(db, "entry", LinkStateExpression(LINK_STATES[i], now));
+  for (std::size_t i = 0; i < kLinkStates.size(); ++i)
+    status.links_by_state[i] = CountRows(db, "entry", LinkStateExpression(kLinkStates[i], now));
   status.live_sessions = CountRows(db, "session", live);
   status.lapsed_sessions = CountRows(db, "session", lapsed);
   status.live_grants = CountRows(db, "token", live);

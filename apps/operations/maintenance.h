@@ -26,7 +26,7 @@ struct DatabaseStatus {
   std::string journal_mode;
   FileSizes sizes;
   int links = 0;
-  std::array<int, LINK_STATES.size()> links_by_state = {};  ///< In the order of LINK_STATES.
+  std::array<int, kLinkStates.size()> links_by_state = {};  ///< In the order of kLinkStates.
   int live_sessions = 0;
   int lapsed_sessions = 0;
   int live_grants = 0;

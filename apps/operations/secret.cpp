@@ -6,7 +6,7 @@
 
 namespace operations {
 
-Secret::Secret() : bytes_(CAPACITY + 1, '\0') {}
+Secret::Secret() : bytes_(kCapacity + 1, '\0') {}
 
 Secret::Secret(Secret &&other) noexcept
     : bytes_(std::move(other.bytes_)), length_(std::exchange(other.length_, 0)) {}
@@ -24,7 +24,7 @@ Secret::~Secret() {
 }
 
 bool Secret::Append(char byte) {
-  if (length_ == CAPACITY) return false;
+  if (length_ == kCapacity) return false;
   bytes_[length_++] = byte;
   return true;
 }

@@ -12,7 +12,7 @@ namespace operations {
 class Secret {
  public:
   /// The most bytes that a secret may have.
-  static constexpr std::size_t CAPACITY = 4096;
+  static constexpr std::size_t kCapacity = 4096;
 
   Secret();
   Secret(const Secret &) = delete;

@@ -9,7 +9,7 @@
 namespace operations {
 namespace {
 
-constexpr VisitResult LOGIN_RESULTS[] = {
+constexpr VisitResult kLoginResults[] = {
     {VELK_SHARING_LOGIN_OK, "OK", "logged in"},
     {VELK_SHARING_LOGIN_ACCOUNT_REFUSED, "ACCOUNT_REFUSED", "wrong account name or password"},
     {VELK_SHARING_LOGIN_REFUSED, "REFUSED",
@@ -21,7 +21,7 @@ constexpr VisitResult LOGIN_RESULTS[] = {
     {VELK_SHARING_LOGIN_USED_UP, "USED_UP", "the link's number of uses is reached"},
 };
 
-constexpr VisitResult CHECK_RESULTS[] = {
+constexpr VisitResult kCheckResults[] = {
     {VELK_SHARING_AUTH_OK, "OK", "authorised for another day"},
     {VELK_SHARING_AUTH_LAPSED, "LAPSED", "session or grant lapsed while being checked"},
     {VELK_SHARING_AUTH_REFUSED, "REFUSED",
@@ -34,7 +34,7 @@ constexpr VisitResult CHECK_RESULTS[] = {
      "there is no such link, or the session has no live grant on it"},
 };
 
-constexpr VisitResult LOGOUT_RESULTS[] = {
+constexpr VisitResult kLogoutResults[] = {
     {1, "OK", "logged out"},
     {0, "FAILED", "there was no live session with a live grant on this link"},
 };
@@ -96,18 +96,18 @@ VisitResult LogIn(const Visit &visit, Secret &session_id) {
       VelkSharingLogin(buffer.data(), buffer.size(), &parameters, visit.keep_block_state ? 1 : 0);
   for (const char *byte = buffer.c_str(); *byte != '\0'; ++byte) session_id.Append(*byte);
   Wipe(buffer);
-  return Explain(LOGIN_RESULTS, code);
+  return Explain(kLoginResults, code);
 }
 
 VisitResult Check(const Visit &visit) {
   const Request request(visit.address);
   const _tag_sharing_login_params parameters = Parameters(visit);
-  return Explain(CHECK_RESULTS, VelkSharingIsAuthorized(&parameters));
+  return Explain(kCheckResults, VelkSharingIsAuthorized(&parameters));
 }
 
 VisitResult LogOut(const Visit &visit) {
   const Request request(visit.address);
-  return Explain(LOGOUT_RESULTS, VelkSharingLogout(visit.hash.c_str(), Text(visit.session_id)));
+  return Explain(kLogoutResults, VelkSharingLogout(visit.hash.c_str(), Text(visit.session_id)));
 }
 
 }  // namespace operations

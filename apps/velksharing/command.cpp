@@ -7,7 +7,7 @@
 namespace command_line {
 namespace {
 
-constexpr int LARGEST_PAGE = 100000;
+constexpr int kLargestPage = 100000;
 
 std::string Footer(const std::string &example) {
   return "Example:\n  velksharing " + example;
@@ -38,11 +38,11 @@ void PageOptions::AddTo(CLI::App &command) {
                    ->check(CLI::Range(1L, static_cast<long>(INT_MAX)));
   auto *page_size =
       command.add_option("--page-size", page_size_, "Rows of a page; 50 when not given")
-          ->check(CLI::Range(1, LARGEST_PAGE));
+          ->check(CLI::Range(1, kLargestPage));
   auto *offset =
       command.add_option("--offset", offset_, "Rows to skip")->check(CLI::Range(0, INT_MAX));
   auto *limit = command.add_option("--limit", limit_, "Rows to show; 50 when not given")
-                    ->check(CLI::Range(1, LARGEST_PAGE));
+                    ->check(CLI::Range(1, kLargestPage));
   for (CLI::Option *by_row : {offset, limit}) by_row->excludes(page)->excludes(page_size);
 }
 

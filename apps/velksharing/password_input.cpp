@@ -16,7 +16,7 @@ namespace {
 using operations::Failure;
 using operations::SystemFailure;
 
-constexpr int QUESTIONS = 3;
+constexpr int kQuestions = 3;
 
 volatile sig_atomic_t caught_signal = 0;
 
@@ -30,20 +30,20 @@ class SignalPostponement {
     remember.sa_handler = [](int signal) { caught_signal = signal; };
     struct sigaction ignore = {};
     ignore.sa_handler = SIG_IGN;
-    for (std::size_t i = 0; i < SIGNALS.size(); ++i)
-      sigaction(SIGNALS[i], SIGNALS[i] == SIGTSTP ? &ignore : &remember, &before_[i]);
+    for (std::size_t i = 0; i < kSignals.size(); ++i)
+      sigaction(kSignals[i], kSignals[i] == SIGTSTP ? &ignore : &remember, &before_[i]);
   }
   SignalPostponement(const SignalPostponement &) = delete;
   SignalPostponement &operator=(const SignalPostponement &) = delete;
   ~SignalPostponement() {
-    for (std::size_t i = 0; i < SIGNALS.size(); ++i) sigaction(SIGNALS[i], &before_[i], nullptr);
+    for (std::size_t i = 0; i < kSignals.size(); ++i) sigaction(kSignals[i], &before_[i], nullptr);
     if (caught_signal != 0) raise(caught_signal);
   }
 
  private:
-  static constexpr std::array<int, 5> SIGNALS = {SIGINT, SIGQUIT, SIGTERM, SIGHUP, SIGTSTP};
+  static constexpr std::array<int, 5> kSignals = {SIGINT, SIGQUIT, SIGTERM, SIGHUP, SIGTSTP};
 
-  std::array<struct sigaction, SIGNALS.size()> before_ = {};
+  std::array<struct sigaction, kSignals.size()> before_ = {};
 };
 
 /// The controlling terminal, not echoing while this lives.
@@ -99,7 +99,7 @@ bool ReadLine(int file, Secret &line) {
     if (byte == '\n') break;
     if (!line.Append(byte))
       throw Failure(Failure::INVALID,
-                    "the secret is longer than " + std::to_string(Secret::CAPACITY) + " bytes");
+                    "the secret is longer than " + std::to_string(Secret::kCapacity) + " bytes");
   }
   byte = 0;
   return any;
@@ -122,7 +122,7 @@ Secret AskSecret(const std::string &question) {
 }
 
 Secret AskNewSecret(const std::string &question) {
-  for (int asked = 0; asked < QUESTIONS; ++asked) {
+  for (int asked = 0; asked < kQuestions; ++asked) {
     Secret first = AskSecret(asked == 0 ? question : "They differ. " + question);
     if (first.Equals(AskSecret("The same again"))) return first;
   }

@@ -12,7 +12,7 @@ namespace {
 
 using operations::Failure;
 
-constexpr long LAST_MOMENT = 253402300799;  // 9999-12-31T23:59:59Z
+constexpr long kLastMoment = 253402300799;  // 9999-12-31T23:59:59Z
 
 std::optional<long> ParseNumber(const std::string &text) {
   long number = 0;
@@ -43,7 +43,7 @@ std::optional<long> ParseSpan(const std::string &text) {
   if (text.empty()) return std::nullopt;
   const long unit = SecondsOf(text.back());
   const std::optional<long> count = ParseNumber(text.substr(0, text.size() - 1));
-  if (unit == 0 || !count || *count == 0 || *count > LAST_MOMENT / unit) return std::nullopt;
+  if (unit == 0 || !count || *count == 0 || *count > kLastMoment / unit) return std::nullopt;
   return *count * unit;
 }
 
@@ -107,7 +107,7 @@ std::optional<long> Parse(const std::string &text, long now) {
 
 long ParseMoment(const std::string &text, long now) {
   const std::optional<long> moment = Parse(text, now);
-  if (moment && *moment > 0 && *moment <= LAST_MOMENT) return *moment;
+  if (moment && *moment > 0 && *moment <= kLastMoment) return *moment;
   throw Failure(Failure::INVALID,
                 "“" + text +
                     "” is not a time; write it as \"2026-12-31 18:00\", 2026-12-31T18:00:00Z, "
