@@ -13,6 +13,7 @@
 
 #include "support/process.h"
 #include "support/temp_dir.h"
+#include "support/velk_root.h"
 
 namespace fs = std::filesystem;
 
@@ -29,6 +30,7 @@ const std::string kMatrix = PAM_WRAPPER_MODULES "/pam_matrix.so";
 class Authenticators : public testing::Test {
  protected:
   void SetUp() override {
+    if (!velk_test::OwnsSaslauthdSocket()) GTEST_SKIP() << kSocket << " may be in use";
     fs::create_directories(kSocket.parent_path());
     fs::remove(kSocket);
     // The last field is the service that account management lets the account use.

@@ -19,6 +19,7 @@
 #include "support/process.h"
 #include "support/raw_database.h"
 #include "support/temp_dir.h"
+#include "support/velk_root.h"
 #include "velk/velkcgi.h"
 #include "velk/velksdk.h"
 
@@ -47,10 +48,13 @@ constexpr char kAddress[] = "192.0.2.7";
 class AutoBlock : public testing::Test {
  protected:
   void SetUp() override {
+    if (!velk_test::OwnsVelkRoot()) GTEST_SKIP() << VELK_ROOT " may be in use";
     fs::create_directories(kFolder);
     Clean();
   }
-  void TearDown() override { Clean(); }
+  void TearDown() override {
+    if (velk_test::OwnsVelkRoot()) Clean();
+  }
 
   static std::vector<std::string> Files() {
     std::vector<std::string> names;

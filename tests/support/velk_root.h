@@ -15,6 +15,11 @@ inline bool OwnsVelkRoot() {
   return std::string(VELK_ROOT).rfind(VELK_BINARY_DIR "/", 0) == 0;
 }
 
+/// Whether saslauthd's socket belongs to the tests: another may be that of a running one.
+inline bool OwnsSaslauthdSocket() {
+  return std::string(VELK_SASLAUTHD_SOCKET).rfind(VELK_BINARY_DIR "/", 0) == 0;
+}
+
 inline std::string SharingDatabasePath() {
   return VELK_ROOT "/etc/private/session/sharing.db";
 }
