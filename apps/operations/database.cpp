@@ -125,8 +125,9 @@ Transaction::~Transaction() {
 }
 
 void Transaction::Commit() {
+  // Not BaseDB::Commit(): the error of its rollback would take the place of the reason.
+  if (!db_.Execute("COMMIT")) throw DatabaseFailure(db_, "the change could not be stored");
   open_ = false;
-  if (!db_.Commit()) throw DatabaseFailure(db_, "the change could not be stored");
 }
 
 }  // namespace operations

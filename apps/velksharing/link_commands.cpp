@@ -27,6 +27,12 @@ std::string Joined(const std::vector<std::string> &names) {
   return text;
 }
 
+std::string NeverCounted(const Permissions &permissions) {
+  std::vector<std::string> names = permissions.unknown_users;
+  names.insert(names.end(), permissions.unknown_groups.begin(), permissions.unknown_groups.end());
+  return Joined(names);
+}
+
 std::string UsesText(const Entry &link) {
   const std::string count = std::to_string(link.get_use_count());
   if (link.get_expire_times() <= 0) return count;
@@ -53,9 +59,7 @@ void PrintLink(const Entry &link) {
       {"title", link.get_protect_title()},
       {"accounts", Joined(link.get_protect_users())},
       {"groups", Joined(link.get_protect_groups())},
-      {"never counted", Joined(permissions.unknown_users) +
-                            (permissions.unknown_users.empty() ? "" : " ") +
-                            Joined(permissions.unknown_groups)},
+      {"never counted", NeverCounted(permissions)},
       {"starts", LimitText(link.get_start_at(), "at once")},
       {"expires", LimitText(link.get_expire_at(), "never")},
       {"uses", UsesText(link)},

@@ -20,14 +20,30 @@ std::string UnknownOptions(const CLI::App &program) {
   return text;
 }
 
+/// The innermost group or command that was named.
+const CLI::App &Named(const CLI::App &program) {
+  const CLI::App *app = &program;
+  while (!app->get_subcommands().empty()) app = app->get_subcommands().front();
+  return *app;
+}
+
+bool IsGroup(const CLI::App &app) {
+  return !app.get_subcommands([](const CLI::App *) { return true; }).empty();
+}
+
 std::string UsageMessage(const CLI::App &program, const CLI::ParseError &error) {
   const std::string message = error.what();
   if (dynamic_cast<const CLI::ConversionError *>(&error) != nullptr)
     return message.substr(0, message.find(" = "));
-  if (dynamic_cast<const CLI::ExtrasError *>(&error) == nullptr) return message;
+  const bool missing = dynamic_cast<const CLI::RequiredError *>(&error) != nullptr;
+  const bool surplus = dynamic_cast<const CLI::ExtrasError *>(&error) != nullptr;
+  if (!missing && !surplus) return message;
+  // What is missing may be there under a mistyped name.
   const std::string unknown = UnknownOptions(program);
   if (!unknown.empty()) return "unknown option:" + unknown;
-  return "an argument too many; a password is never an argument";
+  if (surplus) return "an argument too many; a password is never an argument";
+  if (!IsGroup(Named(program))) return message;
+  return program.remaining(true).empty() ? "a command is needed" : "there is no such command";
 }
 
 /// Help without the lists of options that exclude each other: the refusal names them.
@@ -39,14 +55,10 @@ class HelpFormatter : public CLI::Formatter {
   }
 };
 
-/// The command that help is best asked of.
-std::string CommandName(const CLI::App &program) {
-  std::string name = "velksharing";
-  for (const CLI::App *app = &program; !app->get_subcommands().empty();) {
-    app = app->get_subcommands().front();
-    name += " " + app->get_name();
-  }
-  return name;
+/// A group's or command's name with all names before it.
+std::string FullName(const CLI::App &app) {
+  if (app.get_parent() == nullptr) return app.get_name();
+  return FullName(*app.get_parent()) + " " + app.get_name();
 }
 
 /// @return what the program ends with when there is nothing to do.
@@ -58,7 +70,7 @@ std::optional<ExitStatus> Parse(CLI::App &program, int argc, char **argv) {
     program.exit(help);
     return EXIT_DONE;
   } catch (const CLI::ParseError &error) {
-    PrintError(UsageMessage(program, error) + "; see " + CommandName(program) + " --help");
+    PrintError(UsageMessage(program, error) + "; see " + FullName(Named(program)) + " --help");
     return EXIT_USAGE;
   }
 }

@@ -1,3 +1,4 @@
+#include <climits>
 #include <memory>
 
 #include "command.h"
@@ -50,7 +51,7 @@ void AddList(CLI::App &group, Request &request) {
   options->hash.AddTo(*command, "--link", "HASH", "Only on this link");
   command->add_option("--session", options->session_id, "Only of the session with this row id")
       ->type_name("ID")
-      ->check(CLI::PositiveNumber);
+      ->check(CLI::Range(1, INT_MAX));
   options->page.AddTo(*command);
 }
 

@@ -168,6 +168,20 @@ TEST_F(CliDb, AFailedBackupLeavesNothingBehind) {
   EXPECT_THAT(FilesIn(folder), IsEmpty());
 }
 
+TEST_F(CliDb, AChangeThatTheDiskHasNoRoomForIsReportedWithItsReason) {
+  MakeLink();
+  // No file of that process may grow past 64 KiB.
+  const Outcome outcome =
+      velk_test::RunProgram({"/bin/bash", "-c",
+                             "trap '' XFSZ; ulimit -f 64; exec " VELK_BINARY_DIR
+                             "/bin/velksharing link create --project files --title \"$0\"",
+                             std::string(100000, 't')});
+  EXPECT_EQ(3, outcome.status);
+  EXPECT_THAT(outcome.err, HasSubstr("could not be stored: "));
+  EXPECT_THAT(outcome.err, testing::AnyOf(HasSubstr("full"), HasSubstr("I/O")));
+  EXPECT_EQ(1, RunJson({"link", "list"})["total"].asInt());
+}
+
 TEST_F(CliDb, BackupIsConsistentWhileOthersWrite) {
   const TempDir folder;
   MakeLink();

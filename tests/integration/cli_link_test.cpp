@@ -133,6 +133,13 @@ TEST_F(CliLink, UnknownNamesCanBeKeptAsNames) {
   EXPECT_EQ(0u, link["protect_uids"].size());
 }
 
+TEST_F(CliLink, ShowListsTheNamesThatNeverCount) {
+  const std::string hash =
+      MakeLink({"--user", "no such", "--group", "nor this", "--allow-unknown"});
+  EXPECT_THAT(Run({"link", "show", hash}).out,
+              HasSubstr("\nnever counted         no such, nor this\n"));
+}
+
 TEST_F(CliLink, AnUnknownOwnerIsRefused) {
   EXPECT_EQ(1, Refused({"--owner", "no such"}).status);
   EXPECT_EQ(1, Refused({"--owner", ""}).status);

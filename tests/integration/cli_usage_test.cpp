@@ -78,6 +78,18 @@ TEST_F(CliUsage, AnUnknownOptionIsNamedWithoutItsValue) {
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("--pasword"), Not(HasSubstr("tops3cret"))));
 }
 
+TEST_F(CliUsage, AMistypedOptionIsNamedThoughAnotherIsMissing) {
+  EXPECT_THAT(Run({"link", "create", "--projct", "files"}).err,
+              StartsWith("velksharing: unknown option: --projct; see velksharing link create"));
+}
+
+TEST_F(CliUsage, AMistypedCommandIsToldFromAMissingOne) {
+  EXPECT_EQ("velksharing: there is no such command; see velksharing --help\n", Run({"lnik"}).err);
+  EXPECT_EQ("velksharing: there is no such command; see velksharing link --help\n",
+            Run({"link", "lits"}).err);
+  EXPECT_EQ("velksharing: a command is needed; see velksharing link --help\n", Run({"link"}).err);
+}
+
 TEST_F(CliUsage, APasswordThatWasGivenAsAnArgumentIsNotRepeated) {
   for (const auto &arguments :
        {Arguments{"--password", "tops3cret"}, Arguments{"--password=tops3cret"},
