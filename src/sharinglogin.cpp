@@ -199,6 +199,66 @@ int LogAndReturn(Origin origin, const char *format, int result) {
   return result;
 }
 
+/// What the database holds of a logged-in visitor.
+struct Visit {
+  Session session;
+  Token token;
+  Entry entry;
+};
+
+int FindVisit(SharingDB &database, const _tag_sharing_login_params *params, Visit &visit) {
+  if (!SessionDB(database).GetBySessionId(params->session_id, visit.session)) {
+    return VELK_SHARING_AUTH_NO_SESSION;
+  }
+  if (!EntryDB(database).GetByHash(params->hash, visit.entry) ||
+      !TokenDB(database).GetBySessionEntry(visit.session, visit.entry, visit.token)) {
+    return VELK_SHARING_AUTH_NO_GRANT;
+  }
+  return VELK_SHARING_AUTH_OK;
+}
+
+/// Session and grant were live when they were found; their time may have passed since.
+int CheckStillLive(SharingDB &database, const Visit &visit) {
+  if (!visit.entry.IsValid()) {
+    return LogAndReturn(kSource, "%s:%d entry is not valid", VELK_SHARING_AUTH_LINK_INVALID);
+  }
+  if (!visit.session.IsLegal()) {
+    return LogAndReturn(kSource, "%s:%d session is not valid", VELK_SHARING_AUTH_LAPSED);
+  }
+  if (visit.token.IsLegal()) return VELK_SHARING_AUTH_OK;
+  LogErrorWithoutPid(kSource, "%s:%d token is not valid");
+  if (TokenDB(database).Delete(visit.token)) return VELK_SHARING_AUTH_LAPSED;
+  return LogAndReturn(kSource, "%s:%d delete token failed", VELK_SHARING_AUTH_UNUSABLE);
+}
+
+/// Whether the one who asks is the one who logged in.
+int CheckSameVisitor(const Visit &visit, const _tag_sharing_login_params *params,
+                     const std::string &ip) {
+  if (visit.entry.get_protect_type() == Entry::PROTECT_USER) {
+    unsigned int uid = visit.session.get_uid();
+    const int checked = LoginProtectUser(visit.entry, params, uid);
+    if (checked != kAccepted) return LogAndReturn(kSource, "%s:%d user login error", checked);
+  }
+  if (visit.entry.get_enable_match_ip() && ip != visit.session.get_ip()) {
+    LogErrorWithoutPid(kSource, "%s:%d ip not match, %s, %s", ip.c_str(),
+                       visit.session.get_ip().c_str());
+    return VELK_SHARING_AUTH_REFUSED;
+  }
+  return VELK_SHARING_AUTH_OK;
+}
+
+int RenewVisit(SharingDB &database, Visit &visit) {
+  visit.session.set_timeout(EndOfLifetime());
+  if (!SessionDB(database).Update(visit.session)) {
+    return LogAndReturn(kSource, "%s:%d update session failed", VELK_SHARING_AUTH_UNUSABLE);
+  }
+  visit.token.set_timeout(EndOfLifetime());
+  if (!TokenDB(database).Update(visit.token)) {
+    return LogAndReturn(kSource, "%s:%d update token failed", VELK_SHARING_AUTH_UNUSABLE);
+  }
+  return VELK_SHARING_AUTH_OK;
+}
+
 }  // namespace
 
 int VelkSharingLogin(std::string &session_id_out, const _tag_sharing_login_params *params,
@@ -243,14 +303,7 @@ int VelkSharingLogin(std::string &session_id_out, const _tag_sharing_login_param
 
 int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
   SharingDB &database = SharingDB::Instance();
-  SessionDB sessions(database);
-  TokenDB tokens(database);
-  const EntryDB entries(database);
-  Session session;
-  Token token;
-  Entry entry;
   std::string ip;
-
   if (!database.IsGood()) {
     return LogAndReturn(kSource, "%s:%d db is not good", VELK_SHARING_AUTH_UNUSABLE);
   }
@@ -261,41 +314,12 @@ int VelkSharingIsAuthorized(const _tag_sharing_login_params *params) {
     return LogAndReturn(kSource, "%s:%d invalid ip", VELK_SHARING_AUTH_UNUSABLE);
   }
 
-  if (!sessions.GetBySessionId(params->session_id, session)) return VELK_SHARING_AUTH_NO_SESSION;
-  if (!entries.GetByHash(params->hash, entry)) return VELK_SHARING_AUTH_NO_GRANT;
-  if (!tokens.GetBySessionEntry(session, entry, token)) return VELK_SHARING_AUTH_NO_GRANT;
-
-  if (!entry.IsValid()) {
-    return LogAndReturn(kSource, "%s:%d entry is not valid", VELK_SHARING_AUTH_LINK_INVALID);
-  }
-  if (!session.IsLegal()) {
-    return LogAndReturn(kSource, "%s:%d session is not valid", VELK_SHARING_AUTH_LAPSED);
-  }
-  if (!token.IsLegal()) {
-    LogErrorWithoutPid(kSource, "%s:%d token is not valid");
-    if (tokens.Delete(token)) return VELK_SHARING_AUTH_LAPSED;
-    return LogAndReturn(kSource, "%s:%d delete token failed", VELK_SHARING_AUTH_UNUSABLE);
-  }
-
-  if (entry.get_protect_type() == Entry::PROTECT_USER) {
-    unsigned int uid = session.get_uid();
-    const int checked = LoginProtectUser(entry, params, uid);
-    if (checked != kAccepted) return LogAndReturn(kSource, "%s:%d user login error", checked);
-  }
-  if (entry.get_enable_match_ip() && ip != session.get_ip()) {
-    LogErrorWithoutPid(kSource, "%s:%d ip not match, %s, %s", ip.c_str(), session.get_ip().c_str());
-    return VELK_SHARING_AUTH_REFUSED;
-  }
-
-  session.set_timeout(EndOfLifetime());
-  if (!sessions.Update(session)) {
-    return LogAndReturn(kSource, "%s:%d update session failed", VELK_SHARING_AUTH_UNUSABLE);
-  }
-  token.set_timeout(EndOfLifetime());
-  if (!tokens.Update(token)) {
-    return LogAndReturn(kSource, "%s:%d update token failed", VELK_SHARING_AUTH_UNUSABLE);
-  }
-  return VELK_SHARING_AUTH_OK;
+  Visit visit;
+  int result = FindVisit(database, params, visit);
+  if (result == VELK_SHARING_AUTH_OK) result = CheckStillLive(database, visit);
+  if (result == VELK_SHARING_AUTH_OK) result = CheckSameVisitor(visit, params, ip);
+  if (result == VELK_SHARING_AUTH_OK) result = RenewVisit(database, visit);
+  return result;
 }
 
 int VelkSharingLogout(const std::string &hash, const std::string &session_id) {
