@@ -1,7 +1,6 @@
 #include "velksharing/constants.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 
 const char *const SZK_ID_ = "id";
 const char *const SZK_HASH = "hash";
@@ -66,7 +65,6 @@ const int SHARING_PASS_HASH_LENGTH = 6;
 
 const char *const SZF_SHARING_DB_PATH = VELK_ROOT "/etc/private/session/sharing.db";
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing
 
 const char *const SZ_X_SHARING_HEADER = "HTTP_X_VELK_SHARING";

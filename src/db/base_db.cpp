@@ -7,9 +7,7 @@
 #include "velksharing/constants.h"
 #include "velksharing/database.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 namespace {
 
 using internal::DatabasePtr;
@@ -200,6 +198,4 @@ bool BaseDB::Delete(const std::string &table, int id) {
   return Execute("DELETE FROM " + table + " WHERE id=" + std::to_string(id));
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

@@ -3,9 +3,7 @@
 
 #include "velksharing/database.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 
 class ConditionPrivate {
  public:
@@ -142,6 +140,4 @@ std::string Condition::GetSQL() const {
   return private_->GetSQL();
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

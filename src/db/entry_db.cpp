@@ -5,9 +5,7 @@
 #include "velksharing/store.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 namespace {
 
 /// What makes a link expired: a time limit that lies in the past, or a use limit that is reached.
@@ -124,6 +122,4 @@ bool EntryDB::PurgeExpiredByOwnerProject(unsigned int uid, const std::string &pr
   return private_->PurgeExpiredByOwnerProject(uid, project);
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

@@ -1,9 +1,7 @@
 #include "internal/log.h"
 #include "velksharing/store.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 namespace {
 
 using internal::LogError;
@@ -127,6 +125,4 @@ const std::string &ObjectDB::GetTable() const {
   return private_->table();
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

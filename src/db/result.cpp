@@ -6,9 +6,7 @@
 #include "velk/velkdb.h"
 #include "velksharing/database.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 namespace {
 
 bool IsBlank(char character) {
@@ -142,6 +140,4 @@ bool Result::NextRow(Row &row) {
   return true;
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

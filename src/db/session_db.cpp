@@ -3,9 +3,7 @@
 #include "velksharing/constants.h"
 #include "velksharing/store.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 
 class SessionDBPrivate : public ObjectDB {
  public:
@@ -97,6 +95,4 @@ bool SessionDB::PurgeExpired(float probability) {
   return private_->PurgeExpired(probability);
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

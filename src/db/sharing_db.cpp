@@ -7,9 +7,7 @@
 #include "velksharing/constants.h"
 #include "velksharing/database.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 namespace {
 
 using internal::LogError;
@@ -109,6 +107,4 @@ bool SharingDB::IsGood() const {
   return private_->migrated() && BaseDB::IsGood();
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

@@ -1,9 +1,7 @@
 #include "internal/purge.h"
 #include "velksharing/store.h"
 
-namespace VELK {
-namespace sharing {
-namespace db {
+namespace VELK::sharing::db {
 
 class TokenDBPrivate : public ObjectDB {
  public:
@@ -78,6 +76,4 @@ bool TokenDB::PurgeExpired(float probability) {
   return private_->PurgeExpired(probability);
 }
 
-}  // namespace db
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::db

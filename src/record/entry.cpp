@@ -4,9 +4,7 @@
 
 #include "record/entry_private.h"
 
-namespace VELK {
-namespace sharing {
-namespace record {
+namespace VELK::sharing::record {
 
 Entry::Entry() : private_(std::make_unique<EntryPrivate>()) {}
 Entry::Entry(const Entry &other) : private_(std::make_unique<EntryPrivate>(*other.private_)) {}
@@ -263,6 +261,4 @@ Entry &Entry::set_private_data(const Json::Value &private_data) {
   return *this;
 }
 
-}  // namespace record
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::record

@@ -7,9 +7,7 @@
 #include "velksharing/database.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
-namespace record {
+namespace VELK::sharing::record {
 namespace {
 
 using internal::JsonArray;
@@ -222,6 +220,4 @@ void EntryPrivate::DataFromJson(const Json::Value &data) {
       data.isMember(SZK_PRIVATE_DATA) ? data[SZK_PRIVATE_DATA] : Json::Value(Json::objectValue);
 }
 
-}  // namespace record
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::record

@@ -7,9 +7,7 @@
 #include "velksharing/constants.h"
 #include "velksharing/record.h"
 
-namespace VELK {
-namespace sharing {
-namespace record {
+namespace VELK::sharing::record {
 
 /// All that a link is. entry_private.cpp holds its stored form, entry_rules.cpp its rules.
 class EntryPrivate : public Object {
@@ -87,8 +85,6 @@ class EntryPrivate : public Object {
   void DataFromJson(const Json::Value &data);
 };
 
-}  // namespace record
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::record
 
 #endif

@@ -8,9 +8,7 @@
 #include "velk/velkrandom.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
-namespace record {
+namespace VELK::sharing::record {
 namespace {
 
 constexpr char kSource[] = "entry";
@@ -246,6 +244,4 @@ void EntryPrivate::ToJSON(Json::Value &out) const {
   out[SZK_APP] = app_;
 }
 
-}  // namespace record
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::record

@@ -8,9 +8,7 @@
 #include "velksharing/record.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
-namespace record {
+namespace VELK::sharing::record {
 namespace {
 
 using internal::Origin;
@@ -157,6 +155,4 @@ Session &Session::set_timeout(long timeout) {
   return *this;
 }
 
-}  // namespace record
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing::record

@@ -4,8 +4,7 @@
 #include "velk/velkrandom.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 
 bool IsProbabilityHit(float probability) {
   static RANDOM::VELKRandomBase source;
@@ -18,5 +17,4 @@ bool IsProbabilityHit(float probability) {
   }
 }
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing

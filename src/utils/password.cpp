@@ -6,8 +6,7 @@
 #include "internal/secret_text.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 namespace {
 
 std::string LowercaseHex(const unsigned char *bytes, size_t length) {
@@ -54,5 +53,4 @@ bool MD5HashPassword(const std::string &password, std::string &out) {
 }
 #pragma GCC diagnostic pop
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing

@@ -3,8 +3,7 @@
 
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 
 bool StringExplode(std::vector<std::string> &out, const std::string &text, const char *delimiter) {
   if (delimiter == nullptr || *delimiter == '\0') return false;
@@ -19,5 +18,4 @@ bool StringExplode(std::vector<std::string> &out, const std::string &text, const
   return true;
 }
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing

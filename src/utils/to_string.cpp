@@ -2,8 +2,7 @@
 
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 
 template <typename T>
 std::string ToString(T &value) {
@@ -21,5 +20,4 @@ template VELK_EXPORT std::string ToString<int>(int &value);
 template VELK_EXPORT std::string ToString<const int>(const int &value);
 template VELK_EXPORT std::string ToString<const long>(const long &value);
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing

@@ -7,8 +7,7 @@
 #include "velk/velkwins.h"
 #include "velksharing/utils.h"
 
-namespace VELK {
-namespace sharing {
+namespace VELK::sharing {
 namespace {
 
 using internal::GroupPtr;
@@ -119,5 +118,4 @@ bool UserGroupsGet(VELKUSER *user, std::set<unsigned int> &gids) {
   }
 }
 
-}  // namespace sharing
-}  // namespace VELK
+}  // namespace VELK::sharing
