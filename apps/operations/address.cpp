@@ -1,27 +1,28 @@
 #include "operations/address.h"
 
-#include <arpa/inet.h>
-#include <netinet/in.h>
-
-#include <cstring>
-
+#include "common/address.h"
 #include "operations/failure.h"
+#include "velksdk/autoblock_address.h"
 
 namespace operations {
+namespace {
+
+Failure NoAddress(const std::string &text) {
+  return Failure(Failure::INVALID, "“" + text + "” is not an IP address");
+}
+
+}  // namespace
 
 std::string ParseAddress(const std::string &text) {
-  char printed[INET6_ADDRSTRLEN] = "";
-  in_addr v4 = {};
-  if (inet_pton(AF_INET, text.c_str(), &v4) == 1)
-    return inet_ntop(AF_INET, &v4, printed, sizeof printed);
+  const auto address = velk::ParseAddress(text.c_str());
+  if (!address) throw NoAddress(text);
+  return velk::PrintAddress(*address);
+}
 
-  in6_addr v6 = {};
-  const std::string without_zone = text.substr(0, text.find('%'));
-  if (inet_pton(AF_INET6, without_zone.c_str(), &v6) != 1)
-    throw Failure(Failure::INVALID, "“" + text + "” is not an IP address");
-  if (!IN6_IS_ADDR_V4MAPPED(&v6)) return inet_ntop(AF_INET6, &v6, printed, sizeof printed);
-  std::memcpy(&v4, v6.s6_addr + 12, sizeof v4);
-  return inet_ntop(AF_INET, &v4, printed, sizeof printed);
+std::string ParseBlockAddress(const std::string &text) {
+  const auto key = velk::AutoBlockKey(text.c_str());
+  if (!key) throw NoAddress(text);
+  return *key;
 }
 
 }  // namespace operations

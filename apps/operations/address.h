@@ -10,6 +10,11 @@ namespace operations {
 /// @throws Failure INVALID when `text` is no address.
 std::string ParseAddress(const std::string &text);
 
+/// What blocking remembers an address by, as the list of blocked addresses prints it: an IPv4
+/// address, or the /64 network of an IPv6 address. Takes such a network, too.
+/// @throws Failure INVALID when `text` is neither.
+std::string ParseBlockAddress(const std::string &text);
+
 }  // namespace operations
 
 #endif

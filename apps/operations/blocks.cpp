@@ -1,5 +1,6 @@
 #include "operations/blocks.h"
 
+#include <algorithm>
 #include <exception>
 
 #include "operations/address.h"
@@ -9,7 +10,7 @@
 namespace operations {
 namespace {
 
-constexpr const char *CATEGORY = "manual";
+constexpr char kCategory[] = "manual";
 
 Failure Unusable() {
   return Failure(Failure::SYSTEM, "the file of blocked addresses " VELK_ROOT
@@ -29,6 +30,12 @@ int Collect(const VELKAutoBlockRecord *record, void *data) {
   }
 }
 
+bool IsRemembered(const std::string &key) {
+  const std::vector<Block> blocks = ListBlocks(true);
+  return std::any_of(blocks.begin(), blocks.end(),
+                     [&](const Block &block) { return block.address == key; });
+}
+
 }  // namespace
 
 std::vector<Block> ListBlocks(bool with_failing) {
@@ -39,15 +46,15 @@ std::vector<Block> ListBlocks(bool with_failing) {
 }
 
 void AddBlock(const std::string &address, long seconds) {
-  if (VELKAutoBlockAdd(ParseAddress(address).c_str(), CATEGORY, seconds) != 0) throw Unusable();
+  const std::string key = ParseBlockAddress(address);
+  if (VELKAutoBlockAdd(key.c_str(), kCategory, seconds) != 0) throw Unusable();
 }
 
 void RemoveBlock(const std::string &address) {
-  const std::string parsed = ParseAddress(address);
-  const std::size_t before = ListBlocks(true).size();
-  if (VELKAutoBlockResetByIP(parsed.c_str()) != 0) throw Unusable();
-  if (ListBlocks(true).size() == before)
-    throw Failure(Failure::NOT_FOUND, "address " + parsed + " is not remembered");
+  const std::string key = ParseBlockAddress(address);
+  if (!IsRemembered(key))
+    throw Failure(Failure::NOT_FOUND, "address " + key + " is not remembered");
+  if (VELKAutoBlockResetByIP(key.c_str()) != 0) throw Unusable();
 }
 
 }  // namespace operations

@@ -22,11 +22,11 @@ struct Block {
 /// @param with_failing also the addresses that have failed but are not blocked.
 std::vector<Block> ListBlocks(bool with_failing);
 
-/// Blocks an address by hand.
+/// Blocks an address by hand; `address` as ParseBlockAddress() takes it.
 /// @param seconds how long from now; 0 = for ever.
 void AddBlock(const std::string &address, long seconds);
 
-/// Forgets an address: its block and its failures.
+/// Forgets an address, given as to AddBlock(): its block and its failures.
 void RemoveBlock(const std::string &address);
 
 }  // namespace operations

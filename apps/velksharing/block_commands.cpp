@@ -76,7 +76,7 @@ void AddRemove(CLI::App &group, Request &request) {
   CLI::App *command = AddCommand(
       group, request, "remove", "Forget the block and the failures of addresses",
       "block remove 203.0.113.7", [addresses, &request] { return Remove(*addresses, request); });
-  command->add_option("ADDRESS", *addresses, "IPv4 or IPv6")->required();
+  command->add_option("ADDRESS", *addresses, "IPv4 or IPv6; IPv6 counts by its /64")->required();
 }
 
 }  // namespace

@@ -13,6 +13,8 @@ using velk_test::Outcome;
 using velk_test::RawDatabase;
 using velk_test::SharingDatabasePath;
 
+constexpr char kBlockFile[] = VELK_ROOT "/etc/private/autoblock.db";
+
 class CliSession : public velk_test::CommandLine {};
 class CliToken : public velk_test::CommandLine {};
 class CliBlock : public velk_test::CommandLine {};
@@ -140,6 +142,44 @@ TEST_F(CliBlock, RemoveLetsTheVisitorBackIn) {
   EXPECT_EQ(1, Run({"block", "remove", "192.0.2.7"}).status) << "it is not remembered any more";
 }
 
+TEST_F(CliBlock, TakesAnAddressAsTheListPrintsIt) {
+  Run({"block", "add", "2001:db8:0:1::5"});
+  const std::string printed = RunJson({"block", "list"})["blocks"][0]["address"].asString();
+  ASSERT_EQ("2001:db8:0:1::/64", printed);
+  EXPECT_EQ(0, Run({"block", "add", printed, "--for", "2h"}).status);
+  EXPECT_EQ(1u, RunJson({"block", "list"})["blocks"].size());
+  EXPECT_EQ(0, Run({"block", "remove", printed}).status);
+  EXPECT_EQ(0u, RunJson({"block", "list"})["blocks"].size());
+  EXPECT_EQ(1, Run({"block", "remove", printed}).status) << "it is not remembered any more";
+}
+
+TEST_F(CliBlock, RemoveFindsTheNetworkOfAnAddress) {
+  Run({"block", "add", "2001:db8:0:1::5", "192.0.2.7"});
+  EXPECT_EQ(0, Run({"block", "remove", "2001:DB8:0:1::6"}).status);
+  EXPECT_EQ(0, Run({"block", "remove", "::ffff:192.0.2.7"}).status);
+  EXPECT_EQ(0u, RunJson({"block", "list"})["blocks"].size());
+}
+
+TEST_F(CliBlock, NoOtherNetworkIsTaken) {
+  for (const char *network : {"192.0.2.7/64", "192.0.2.0/24", "2001:db8::/48", "/64", ""}) {
+    EXPECT_EQ(2, Run({"block", "add", network}).status) << network;
+    EXPECT_EQ(2, Run({"block", "remove", network}).status) << network;
+  }
+}
+
+TEST_F(CliBlock, RemoveIsNotMisledByAnAddressThatFailsMeanwhile) {
+  Run({"block", "add", "192.0.2.7"});
+  RawDatabase(kBlockFile).Run(R"sql(
+    CREATE TRIGGER meanwhile AFTER DELETE ON autoblock BEGIN
+      INSERT INTO autoblock VALUES ('192.0.2.8', 'SHARING', 1, 1000, 1000, NULL);
+    END)sql");
+  const Outcome outcome = Run({"block", "remove", "192.0.2.7"});
+  EXPECT_EQ(0, outcome.status) << outcome.err;
+  const Json::Value all = RunJson({"block", "list", "--all"})["blocks"];
+  ASSERT_EQ(1u, all.size());
+  EXPECT_EQ("192.0.2.8", all[0]["address"].asString());
+}
+
 TEST_F(CliBlock, FailuresShowOnlyWhenAskedFor) {
   const std::string hash = MakeLink({"--password-stdin"}, "secret\n");
   Run({"visit", "login", hash, "--ip", "192.0.2.7", "--password-stdin"}, "wrong\n");
@@ -152,7 +192,7 @@ TEST_F(CliBlock, FailuresShowOnlyWhenAskedFor) {
 }
 
 TEST_F(CliBlock, AnUnusableBlockFileIsAnErrorOfTheSystem) {
-  velk_test::WriteFile(VELK_ROOT "/etc/private/autoblock.db", std::string(8192, 'x'));
+  velk_test::WriteFile(kBlockFile, std::string(8192, 'x'));
   EXPECT_EQ(3, Run({"block", "list"}).status);
   EXPECT_EQ(3, Run({"block", "add", "192.0.2.7"}).status);
 }
