@@ -48,7 +48,7 @@ void Cookies::Load(std::string_view header) {
 
 bool Cookies::Set(std::string_view name, std::string_view value) {
   if (!IsCookie(name, value)) return false;
-  values_.insert_or_assign(std::string(name), value);
+  values_.insert_or_assign(std::string(name), Secret(value));
   return true;
 }
 

@@ -6,9 +6,11 @@
 #include <string>
 #include <string_view>
 
+#include "secret.h"
+
 namespace velk {
 
-/// Cookies by name.
+/// Cookies by name. Their values are wiped when they go.
 class Cookies {
  public:
   /// Adds those of a Cookie header that are not there yet. What is no cookie is passed over.
@@ -22,7 +24,7 @@ class Cookies {
   const char *Find(std::string_view name) const;
 
  private:
-  std::map<std::string, std::string, std::less<>> values_;
+  std::map<std::string, Secret, std::less<>> values_;
 };
 
 }  // namespace velk

@@ -26,19 +26,23 @@ int EscapedByte(std::string_view text) {
   return high < 0 || low < 0 ? -1 : high * 16 + low;
 }
 
-std::string Decode(std::string_view text) {
-  std::string decoded;
-  decoded.reserve(text.size());  // a growing text would leave copies of a password behind
-  while (!text.empty()) {
-    const int escaped = EscapedByte(text);
-    if (escaped >= 0) {
-      decoded += static_cast<char>(escaped);
-      text.remove_prefix(3);
-      continue;
-    }
-    decoded += text[0] == '+' ? ' ' : text[0];
-    text.remove_prefix(1);
-  }
+/// Takes what stands for one decoded byte off `encoded`, which must not be empty.
+char TakeByte(std::string_view &encoded) {
+  const int escaped = EscapedByte(encoded);
+  const char byte = encoded[0] == '+' ? ' ' : encoded[0];
+  encoded.remove_prefix(escaped >= 0 ? 3 : 1);
+  return escaped >= 0 ? static_cast<char>(escaped) : byte;
+}
+
+size_t DecodedLength(std::string_view encoded) {
+  size_t length = 0;
+  for (; !encoded.empty(); ++length) TakeByte(encoded);
+  return length;
+}
+
+Secret Decode(std::string_view encoded) {
+  Secret decoded(DecodedLength(encoded));
+  for (char *out = decoded.data(); !encoded.empty(); ++out) *out = TakeByte(encoded);
   return decoded;
 }
 
@@ -58,18 +62,18 @@ bool IsForm() {
 
 }  // namespace
 
-std::optional<std::string> FindParameter(std::string_view encoded, std::string_view name) {
+std::optional<Secret> FindParameter(std::string_view encoded, std::string_view name) {
   while (!encoded.empty()) {
     std::string_view value = TakeUpTo('&', encoded);
-    if (Decode(TakeUpTo('=', value)) != name) continue;
-    std::string decoded = Decode(value);
-    if (decoded.find('\0') != std::string::npos) return std::nullopt;
+    if (Decode(TakeUpTo('=', value)).view() != name) continue;
+    Secret decoded = Decode(value);
+    if (decoded.view().find('\0') != std::string_view::npos) return std::nullopt;
     return decoded;
   }
   return std::nullopt;
 }
 
-std::optional<std::string> RequestParameter(std::string_view name) {
+std::optional<Secret> RequestParameter(std::string_view name) {
   const char *query = RequestVariable("QUERY_STRING");
   if (query != nullptr) {
     if (auto value = FindParameter(query, name)) return value;

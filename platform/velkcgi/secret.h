@@ -7,20 +7,25 @@
 
 namespace velk {
 
-/// Bytes that are wiped when they go. Their number never changes, so no copy stays behind in
-/// memory that a growing buffer has left.
+/// Bytes that are wiped when they go, with a zero byte behind them. Their number never changes, so
+/// no copy stays behind in memory that a growing buffer has left. One that was moved from may only
+/// be destroyed.
 class Secret {
  public:
-  explicit Secret(size_t size) : bytes_(size) {}
+  /// Zero bytes, to be filled.
+  explicit Secret(size_t size) : bytes_(size + 1) {}
+  explicit Secret(std::string_view text);
   Secret(const Secret &) = delete;
   Secret &operator=(const Secret &) = delete;
   Secret(Secret &&) = default;
-  Secret &operator=(Secret &&) = delete;
+  /// Swaps, so that the bytes there were are wiped with `other`.
+  Secret &operator=(Secret &&other) noexcept;
   ~Secret();
 
   char *data() { return bytes_.data(); }
-  size_t size() const { return bytes_.size(); }
-  std::string_view view() const { return {bytes_.data(), bytes_.size()}; }
+  size_t size() const { return bytes_.size() - 1; }
+  std::string_view view() const { return {bytes_.data(), size()}; }
+  const char *c_str() const { return bytes_.data(); }
 
  private:
   std::vector<char> bytes_;

@@ -1,7 +1,7 @@
 #include "view.h"
 
 #include <cstring>
-#include <optional>
+#include <string>
 #include <utility>
 
 #include "common/address.h"
@@ -12,12 +12,6 @@
 #include "velk/velksdk.h"
 
 using velk::NoThrow;
-
-VelkCgi_tag::~VelkCgi_tag() {
-  for (const std::string &value : given) {
-    explicit_bzero(const_cast<char *>(value.data()), value.size());
-  }
-}
 
 int VelkCgiInit(VelkCgi **cgi, const char *) {
   if (cgi == nullptr) return 0;
@@ -38,7 +32,7 @@ const char *VelkCgiGetRequestParam(VelkCgi *cgi, const char *name, const char *f
   if (cgi == nullptr || name == nullptr) return fallback;
   return NoThrow(fallback, [&] {
     auto value = velk::RequestParameter(name);
-    return value ? cgi->given.insert(std::move(*value)).first->c_str() : fallback;
+    return value ? cgi->given.emplace_back(std::move(*value)).c_str() : fallback;
   });
 }
 

@@ -383,6 +383,15 @@ TEST(VelkCgiCookies, AreStoredInPlaceOfOneWithTheSameName) {
   EXPECT_STREQ("new", VelkCgiGetCookie(view.get(), "id"));
 }
 
+TEST(VelkCgiCookies, MayBeStoredAnewWithTheirOwnText) {
+  const View view = NewView();
+  const std::string value(100, 'x');
+  EXPECT_EQ(1, VelkCgiSetCookies(view.get(), "id", value.c_str(), 0, "/", nullptr, 0));
+  const char *own = VelkCgiGetCookie(view.get(), "id");
+  EXPECT_EQ(1, VelkCgiSetCookies(view.get(), "id", own, 0, "/", nullptr, 0));
+  EXPECT_EQ(value, VelkCgiGetCookie(view.get(), "id"));
+}
+
 TEST(VelkCgiCookies, AreRefusedWithANameThatIsNoToken) {
   const View view = NewView();
   for (const char *name : {"", "a b", "a=b", "a;b", "a\r\n", "\xc3\xa4", "a\x7f", "(a)"}) {

@@ -8,9 +8,10 @@
 /// The web request that the process is serving, and the login of an account.
 ///
 /// Under plain CGI there is nothing to do: the request is the process's environment, and its body
-/// is standard input, which is read at most once and only when a parameter is looked for in it. A
-/// program that serves several requests, or that reads the request body itself, hands each request
-/// over first:
+/// is standard input, which is read at most once and only when a parameter is looked for in it.
+/// What was read is kept until the process exits, and wiped then: one such process serves one
+/// request. A program that serves several requests, or that reads the request body itself, hands
+/// each request over first:
 ///
 ///     VelkCgiRequest request = {envp, body, body_length};
 ///     VelkCgiRequestBegin(&request);
