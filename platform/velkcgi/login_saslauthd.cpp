@@ -33,13 +33,14 @@ void LogErrno() {
 /// A stream to saslauthd, closed at the end of the scope.
 class Stream {
  public:
-  Stream() : socket_(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)) {}
+  Stream() = default;
   Stream(const Stream &) = delete;
   Stream &operator=(const Stream &) = delete;
   ~Stream() {
     if (socket_ != -1) close(socket_);
   }
 
+  /// To be called once. On failure, errno tells why.
   bool Connect() {
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
@@ -48,7 +49,8 @@ class Stream {
       return false;
     }
     memcpy(address.sun_path, kPath, sizeof(kPath));
-    if (!LimitWaits()) return false;
+    socket_ = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    if (socket_ == -1 || !LimitWaits()) return false;
     int outcome;
     do {
       outcome = connect(socket_, reinterpret_cast<sockaddr *>(&address), sizeof(address));
@@ -85,7 +87,7 @@ class Stream {
            setsockopt(socket_, SOL_SOCKET, SO_RCVTIMEO, &limit, sizeof(limit)) == 0;
   }
 
-  int socket_;
+  int socket_ = -1;
 };
 
 /// Appends one field: its length in two bytes, the high one first, then its bytes.
@@ -114,15 +116,31 @@ bool ReadReply(Stream &stream, std::string &reply) {
   return stream.Read(reply.data(), reply.size());
 }
 
+/// What it means that there is no connection. A saslauthd that is too busy to take us, and our own
+/// lack of means, must not decide who is asked about an account: they refuse.
+SaslauthdAnswer AnswerWithoutConnection() {
+  switch (errno) {
+    case ENOENT:
+    case ECONNREFUSED:
+      return SaslauthdAnswer::kNotReachable;
+    case EAGAIN:
+    case EMFILE:
+    case ENFILE:
+    case ENOBUFS:
+    case ENOMEM:
+      LogErrno();
+      return SaslauthdAnswer::kRefused;
+    default:
+      LogErrno();
+      return SaslauthdAnswer::kNotReachable;
+  }
+}
+
 }  // namespace
 
 SaslauthdAnswer AskSaslauthd(std::string_view name, std::string_view password) {
   Stream stream;
-  if (!stream.Connect()) {
-    const bool nobody_there = errno == ENOENT || errno == ECONNREFUSED;
-    if (!nobody_there) LogErrno();
-    return SaslauthdAnswer::kNotReachable;
-  }
+  if (!stream.Connect()) return AnswerWithoutConnection();
   std::string reply;
   if (!stream.Write(MakeRequest(name, password).view()) || !ReadReply(stream, reply)) {
     LogErrno();

@@ -7,8 +7,9 @@ namespace velk {
 
 enum class SaslauthdAnswer {
   kAccepted,
-  kRefused,       ///< It said no, or did not say yes in an orderly way (logged).
-  kNotReachable,  ///< Nobody answers on the socket.
+  kRefused,       ///< It said no; or it did not say yes in time and in an orderly way, or we lack
+                  ///< the means to ask (both logged).
+  kNotReachable,  ///< Nobody listens on the socket, or we may not use it (logged).
 };
 
 /// Asks the saslauthd on VELK_SASLAUTHD_SOCKET whether the password is the account's. Its own

@@ -2,7 +2,9 @@
 #include <fcntl.h>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <security/pam_appl.h>
 #include <signal.h>
+#include <sys/resource.h>
 #include <sys/socket.h>
 #include <sys/time.h>
 #include <sys/un.h>
@@ -21,6 +23,19 @@
 #include "velk/velkcgi.h"
 
 namespace fs = std::filesystem;
+
+namespace {
+
+int pam_asked = 0;
+
+}  // namespace
+
+/// In place of PAM's own, for the whole program: sees who is asked after saslauthd.
+[[gnu::visibility("default")]] int pam_start(const char *, const char *, const pam_conv *,
+                                             pam_handle_t **) {
+  ++pam_asked;
+  return PAM_SYSTEM_ERR;
+}
 
 namespace {
 
@@ -54,6 +69,13 @@ std::string ReadField(int connection) {
                                  static_cast<unsigned char>(length[1]));
 }
 
+sockaddr_un SocketAddress() {
+  sockaddr_un address{};
+  address.sun_family = AF_UNIX;
+  strncpy(address.sun_path, kSocket.c_str(), sizeof(address.sun_path) - 1);
+  return address;
+}
+
 /// Listens where saslauthd would, and lets `serve` answer each caller.
 class Server {
  public:
@@ -61,10 +83,8 @@ class Server {
     fs::create_directories(kSocket.parent_path());
     fs::remove(kSocket);
     listener_ = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    strncpy(address.sun_path, kSocket.c_str(), sizeof(address.sun_path) - 1);
-    EXPECT_EQ(0, bind(listener_, reinterpret_cast<sockaddr *>(&address), sizeof(address)));
+    const sockaddr_un address = SocketAddress();
+    EXPECT_EQ(0, bind(listener_, reinterpret_cast<const sockaddr *>(&address), sizeof(address)));
     EXPECT_EQ(0, listen(listener_, 8));
     thread_ = std::thread([this, serve] {
       int connection;
@@ -94,6 +114,48 @@ std::function<void(int)> AnswerWith(const std::string &bytes) {
   };
 }
 
+/// A socket like saslauthd's where nobody takes a caller off the queue, which is full.
+class CrowdedServer {
+ public:
+  CrowdedServer() {
+    fs::create_directories(kSocket.parent_path());
+    fs::remove(kSocket);
+    const sockaddr_un address = SocketAddress();
+    const auto *generic = reinterpret_cast<const sockaddr *>(&address);
+    EXPECT_EQ(0, bind(Open(), generic, sizeof(address)));
+    EXPECT_EQ(0, listen(sockets_.front(), 0));
+    while (connect(Open(), generic, sizeof(address)) == 0) {
+    }
+    EXPECT_EQ(EAGAIN, errno);
+  }
+  ~CrowdedServer() {
+    for (const int file : sockets_) close(file);
+    fs::remove(kSocket);
+  }
+
+ private:
+  int Open() {
+    sockets_.push_back(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
+    return sockets_.back();
+  }
+
+  std::vector<int> sockets_;
+};
+
+/// The process may open no further file while this lives.
+class NoDescriptors {
+ public:
+  NoDescriptors() {
+    getrlimit(RLIMIT_NOFILE, &before_);
+    const rlimit none{0, before_.rlim_max};
+    EXPECT_EQ(0, setrlimit(RLIMIT_NOFILE, &none));
+  }
+  ~NoDescriptors() { setrlimit(RLIMIT_NOFILE, &before_); }
+
+ private:
+  rlimit before_;
+};
+
 int Login(const char *name, const char *password, char *out = nullptr, size_t capacity = 0) {
   VelkCgi *view = nullptr;
   VelkCgiInit(&view, "");
@@ -101,6 +163,13 @@ int Login(const char *name, const char *password, char *out = nullptr, size_t ca
   const int outcome = VelkCgiLogin(view, out, capacity, &record);
   VelkCgiFree(view);
   return outcome;
+}
+
+/// How long a login takes that is refused.
+std::chrono::steady_clock::duration TimeToRefuse() {
+  const auto start = std::chrono::steady_clock::now();
+  EXPECT_EQ(0, Login("alice", "secret"));
+  return std::chrono::steady_clock::now() - start;
 }
 
 std::string LogPrefix() {
@@ -111,6 +180,7 @@ class VelkCgiLogin : public testing::Test {
  protected:
   void SetUp() override {
     if (!velk_test::OwnsSaslauthdSocket()) GTEST_SKIP() << kSocket << " may be in use";
+    pam_asked = 0;
   }
 };
 
@@ -223,12 +293,54 @@ TEST_F(VelkCgiLogin, DoesNotWaitForEverForAServerThatSaysNothing) {
     while (recv(connection, rest, sizeof(rest), 0) > 0) {
     }
   });
-  const auto start = std::chrono::steady_clock::now();
-  EXPECT_EQ(0, Login("alice", "secret"));
-  const auto waited = std::chrono::steady_clock::now() - start;
+  const auto waited = TimeToRefuse();
   EXPECT_GE(waited, std::chrono::seconds(9));
   EXPECT_LE(waited, std::chrono::seconds(15));
   EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "no answer in time"));
+}
+
+TEST_F(VelkCgiLogin, ABusyServersSilenceIsARefusal) {
+  LogCapture log;
+  const CrowdedServer server;
+  const auto waited = TimeToRefuse();
+  EXPECT_GE(waited, std::chrono::seconds(9));
+  EXPECT_LE(waited, std::chrono::seconds(15));
+  EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "no answer in time"));
+  EXPECT_EQ(0, pam_asked);
+}
+
+TEST_F(VelkCgiLogin, LackOfDescriptorsIsARefusal) {
+  LogCapture log;
+  const Server server(AnswerWith(Field("OK")));
+  {
+    const NoDescriptors limit;
+    EXPECT_EQ(0, Login("alice", "secret"));
+  }
+  EXPECT_THAT(log.Texts(), ElementsAre(LogPrefix() + "Too many open files"));
+  EXPECT_EQ(0, pam_asked);
+}
+
+TEST_F(VelkCgiLogin, GoesOnWithPamWhereNobodyAnswers) {
+  LogCapture log;
+  fs::create_directories(kSocket.parent_path());
+  fs::remove(kSocket);
+  EXPECT_EQ(0, Login("alice", "secret"));
+  EXPECT_EQ(1, pam_asked);
+  EXPECT_THAT(log.lines(), IsEmpty());
+}
+
+TEST_F(VelkCgiLogin, GoesOnWithPamWhereTheServerHasLeftItsSocket) {
+  LogCapture log;
+  fs::create_directories(kSocket.parent_path());
+  fs::remove(kSocket);
+  const sockaddr_un address = SocketAddress();
+  const int file = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+  EXPECT_EQ(0, bind(file, reinterpret_cast<const sockaddr *>(&address), sizeof(address)));
+  close(file);
+  EXPECT_EQ(0, Login("alice", "secret"));
+  EXPECT_EQ(1, pam_asked);
+  EXPECT_THAT(log.lines(), IsEmpty());
+  fs::remove(kSocket);
 }
 
 TEST_F(VelkCgiLogin, KeepsItsSocketFromOtherPrograms) {

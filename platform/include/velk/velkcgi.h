@@ -87,7 +87,8 @@ VELK_PLATFORM_API int VelkCgiSetCookies(VelkCgi *cgi, const char *name, const ch
 /// Checks an account's name and password, through saslauthd where one answers on its socket, else
 /// through the PAM service "velk" in this process. Locked and expired accounts are refused, and so
 /// are names and passwords that are empty, longer than 256 bytes or hold a control byte. What
-/// saslauthd refuses, or does not answer within 10 seconds, is not tried again through PAM. The
+/// saslauthd refuses, or does not answer within 10 seconds (a full queue included), is not tried
+/// again through PAM, and neither is what cannot be asked for lack of descriptors or memory. The
 /// password is not kept; buffers that held it are wiped. May wait for seconds: authenticators
 /// delay the answer to a wrong password.
 /// @param name_out receives the account's name as the authenticator reports it (saslauthd reports
