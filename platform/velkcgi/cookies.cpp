@@ -2,8 +2,12 @@
 
 #include <algorithm>
 
+#include "common/text.h"
+
 namespace velk {
 namespace {
+
+constexpr std::string_view kBlanks = " \t";
 
 bool IsTokenCharacter(char c) {
   constexpr std::string_view kSeparators = "()<>@,;:\\\"/[]?={}";
@@ -17,13 +21,6 @@ bool IsValueCharacter(char c) {
 bool IsCookie(std::string_view name, std::string_view value) {
   return !name.empty() && std::all_of(name.begin(), name.end(), IsTokenCharacter) &&
          std::all_of(value.begin(), value.end(), IsValueCharacter);
-}
-
-std::string_view Trim(std::string_view text) {
-  constexpr std::string_view kBlanks = " \t";
-  const size_t first = text.find_first_not_of(kBlanks);
-  if (first == std::string_view::npos) return {};
-  return text.substr(first, text.find_last_not_of(kBlanks) - first + 1);
 }
 
 /// Browsers may send a value in quotes, which do not belong to it.
@@ -40,8 +37,8 @@ void Cookies::Load(std::string_view header) {
     header.remove_prefix(std::min(pair.size() + 1, header.size()));
     const size_t sign = pair.find('=');
     if (sign == std::string_view::npos) continue;
-    const std::string_view name = Trim(pair.substr(0, sign));
-    const std::string_view value = Unquote(Trim(pair.substr(sign + 1)));
+    const std::string_view name = Trim(pair.substr(0, sign), kBlanks);
+    const std::string_view value = Unquote(Trim(pair.substr(sign + 1), kBlanks));
     if (IsCookie(name, value)) values_.try_emplace(std::string(name), value);
   }
 }

@@ -7,6 +7,7 @@
 #include <string_view>
 
 #include "common/no_throw.h"
+#include "common/text.h"
 #include "login_pam.h"
 #include "login_saslauthd.h"
 #include "velk/velkcgi.h"
@@ -52,9 +53,7 @@ std::optional<std::string> CheckAccount(const char *name, const char *password) 
 /// Copies the name where one is wanted; false when it does not fit.
 bool GiveName(const std::string &name, char *out, size_t capacity) {
   if (out == nullptr) return capacity == 0;
-  if (name.size() >= capacity) return false;
-  memcpy(out, name.c_str(), name.size() + 1);
-  return true;
+  return CopyText(name, out, capacity);
 }
 
 }  // namespace

@@ -1,11 +1,10 @@
 #include "view.h"
 
-#include <cstring>
-#include <string>
 #include <utility>
 
 #include "common/address.h"
 #include "common/no_throw.h"
+#include "common/text.h"
 #include "parameters.h"
 #include "request.h"
 #include "velk/velkcgi.h"
@@ -47,14 +46,10 @@ int VelkCgiSetCookies(VelkCgi *cgi, const char *name, const char *value, long, c
 }
 
 int VelkCgiGetRemoteIP(char *out, size_t capacity) {
-  if (out == nullptr) return -1;
   return NoThrow(-1, [&] {
     const auto address = velk::ParseAddress(velk::RequestVariable("REMOTE_ADDR"));
     if (!address) return -1;
-    const std::string text = velk::PrintAddress(*address);
-    if (text.size() >= capacity) return -1;
-    memcpy(out, text.c_str(), text.size() + 1);
-    return 0;
+    return velk::CopyText(velk::PrintAddress(*address), out, capacity) ? 0 : -1;
   });
 }
 

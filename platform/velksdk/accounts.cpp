@@ -4,14 +4,17 @@
 #include <string_view>
 
 #include "common/no_throw.h"
+#include "common/text.h"
 #include "name_service.h"
 #include "velk/velksdk.h"
 
 namespace {
 
 using velk::Account;
+using velk::CopyText;
 using velk::FindAccount;
 using velk::NoThrow;
+using velk::Trim;
 
 constexpr std::string_view kBlanks = " \t\r\n\v\f";
 
@@ -39,12 +42,6 @@ int GiveUser(Key key, VELKUSER **user) {
   });
 }
 
-std::string Trim(std::string_view text) {
-  const size_t first = text.find_first_not_of(kBlanks);
-  if (first == std::string_view::npos) return "";
-  return std::string(text.substr(first, text.find_last_not_of(kBlanks) - first + 1));
-}
-
 std::string LowerCase(std::string text) {
   for (char &letter : text) {
     if (letter >= 'A' && letter <= 'Z') letter += 'a' - 'A';
@@ -55,9 +52,7 @@ std::string LowerCase(std::string text) {
 /// Copies `text` with its terminator.
 /// @return its length, or `no_room`.
 int Give(const std::string &text, char *out, size_t capacity, int no_room) {
-  if (out == nullptr || text.size() >= capacity) return no_room;
-  memcpy(out, text.c_str(), text.size() + 1);
-  return static_cast<int>(text.size());
+  return CopyText(text, out, capacity) ? static_cast<int>(text.size()) : no_room;
 }
 
 }  // namespace
@@ -79,7 +74,7 @@ void VELKUserFree(VELKUSER *user) {
 int VELKUserLoginNameConvert(const char *name, char *out, size_t capacity) {
   if (name == nullptr) return 0;
   return NoThrow(0, [&] {
-    const std::string typed = Trim(name);
+    const std::string typed(Trim(name, kBlanks));
     if (FindAccount(typed.c_str())) return Give(typed, out, capacity, 0);
     const std::string lower = LowerCase(typed);
     if (FindAccount(lower.c_str())) return Give(lower, out, capacity, 0);

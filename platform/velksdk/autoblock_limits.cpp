@@ -11,6 +11,8 @@
 #include <string>
 #include <string_view>
 
+#include "common/text.h"
+
 namespace velk {
 namespace {
 
@@ -36,12 +38,6 @@ class Mistake : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-std::string_view Trim(std::string_view text) {
-  const size_t first = text.find_first_not_of(kBlanks);
-  if (first == std::string_view::npos) return {};
-  return text.substr(first, text.find_last_not_of(kBlanks) - first + 1);
-}
-
 const Setting &FindSetting(std::string_view key) {
   for (const Setting &setting : kSettings) {
     if (setting.key == key) return setting;
@@ -63,13 +59,13 @@ long ReadNumber(std::string_view text, const Setting &setting) {
 }
 
 void ReadLine(std::string_view line, AutoBlockLimits &limits, std::set<std::string_view> &seen) {
-  line = Trim(line.substr(0, line.find('#')));
+  line = Trim(line.substr(0, line.find('#')), kBlanks);
   if (line.empty()) return;
   const size_t sign = line.find('=');
   if (sign == std::string_view::npos) throw Mistake("not of the form \"key = value\"");
-  const Setting &setting = FindSetting(Trim(line.substr(0, sign)));
+  const Setting &setting = FindSetting(Trim(line.substr(0, sign), kBlanks));
   if (!seen.insert(setting.key).second) throw Mistake("key given twice");
-  limits.*setting.value = ReadNumber(Trim(line.substr(sign + 1)), setting);
+  limits.*setting.value = ReadNumber(Trim(line.substr(sign + 1), kBlanks), setting);
 }
 
 }  // namespace

@@ -1,8 +1,8 @@
 #include <climits>
-#include <cstring>
 #include <string>
 
 #include "common/no_throw.h"
+#include "common/text.h"
 #include "velk/velkwins.h"
 #include "winbind.h"
 
@@ -17,9 +17,9 @@ std::string WithShortDomain(const std::string &name) {
   return domain.empty() ? "" : domain + name.substr(backslash);
 }
 
-int CopyOut(const std::string &text, char *out, size_t capacity) {
-  if (text.empty() || text.size() >= capacity || text.size() > INT_MAX) return 0;
-  memcpy(out, text.c_str(), text.size() + 1);
+/// Copies a name that was converted. @return its length, or 0.
+int Give(const std::string &text, char *out, size_t capacity) {
+  if (text.empty() || text.size() > INT_MAX || !velk::CopyText(text, out, capacity)) return 0;
   return static_cast<int>(text.size());
 }
 
@@ -27,5 +27,5 @@ int CopyOut(const std::string &text, char *out, size_t capacity) {
 
 int VELKWinsUserNameFqdn2Netbios(const char *name, char *out, size_t capacity) {
   if (name == nullptr || out == nullptr) return 0;
-  return velk::NoThrow(0, [&] { return CopyOut(WithShortDomain(name), out, capacity); });
+  return velk::NoThrow(0, [&] { return Give(WithShortDomain(name), out, capacity); });
 }
