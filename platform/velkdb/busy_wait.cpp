@@ -12,7 +12,7 @@ constexpr std::chrono::seconds kPatience{10};
 constexpr std::chrono::microseconds kShortestSleep{50};
 constexpr int kDoublings = 7;  // up to 6.4 ms: a write takes less, so nobody sleeps past his turn
 
-// Between half and one and a half of the nominal time.
+/// Between half and one and a half of the nominal time.
 std::chrono::nanoseconds SleepTime(int attempt) {
   const std::chrono::nanoseconds nominal = kShortestSleep * (1 << std::min(attempt, kDoublings));
   unsigned short chance = 0;

@@ -15,10 +15,10 @@ struct Free {
   void operator()(char *memory) const { std::free(memory); }
 };
 
-// The path with its directory part resolved, for SQLite refuses a symbolic link anywhere in the
-// path it is told to take as it is, and we mean the last step alone. "" when that cannot be done.
+/// The path with its directory part resolved, for SQLite refuses a symbolic link anywhere in the
+/// path it is told to take as it is, and we mean the last step alone. "" when that cannot be done.
 std::string WithDirectoryResolved(const std::string &path) {
-  const std::size_t slash = path.rfind('/');
+  const size_t slash = path.rfind('/');
   const std::string directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
   const std::string name = slash == std::string::npos ? path : path.substr(slash + 1);
   if (name.empty()) return "";
@@ -45,8 +45,8 @@ bool IsEmpty(const std::string &path) {
   return stat(path.c_str(), &file) == 0 && file.st_size == 0;
 }
 
-// Whoever makes the first change may not be allowed to make a log beside the file any more. Where
-// it cannot be made now either, that change fails, with a text to it.
+/// Whoever makes the first change may not be allowed to make a log beside the file any more. Where
+/// it cannot be made now either, that change fails, with a text to it.
 void SwitchToLog(VELKDBHandle &handle) {
   const auto switch_now = [&handle] {
     return sqlite3_exec(handle.sqlite.get(), "PRAGMA journal_mode = WAL", nullptr, nullptr,

@@ -17,7 +17,7 @@ bool SameName(const char *a, const char *b) {
   return sqlite3_stricmp(a, b) == 0;
 }
 
-// `first` and `second` are what SQLite tells about the action: the table, for changes of rows.
+/// `first` and `second` are what SQLite tells about the action: the table, for changes of rows.
 Effect EffectOf(const Durability &durability, int action, const char *first, const char *second,
                 const char *database) {
   switch (action) {
@@ -61,7 +61,7 @@ int FlushLog(sqlite3 *connection, const char *database) {
   return log->pMethods->xSync(log, SQLITE_SYNC_NORMAL);
 }
 
-// False when the file cannot be read; a file without the list is read well, and lists nothing.
+/// False when the file cannot be read; a file without the list is read well, and lists nothing.
 bool ReadList(sqlite3 *connection, std::vector<std::string> &names) {
   sqlite3_stmt *raw = nullptr;
   const int prepared =

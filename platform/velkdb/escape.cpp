@@ -6,11 +6,11 @@
 
 namespace {
 
-// Copies in runs up to and with each quote; the second quote comes behind a run.
+/// Copies in runs up to and with each quote; the second quote comes behind a run.
 char *CopyWithQuotesDoubled(char *out, const char *in, const char *end) {
   while (in != end) {
     const auto *quote =
-        static_cast<const char *>(std::memchr(in, '\'', static_cast<std::size_t>(end - in)));
+        static_cast<const char *>(std::memchr(in, '\'', static_cast<size_t>(end - in)));
     const char *run_end = quote == nullptr ? end : quote + 1;
     out = std::copy(in, run_end, out);
     if (quote != nullptr) *out++ = '\'';

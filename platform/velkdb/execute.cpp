@@ -26,7 +26,7 @@ void KeepError(VELKDBHandle &handle, const char *text) noexcept {
   }
 }
 
-// The time that one statement may wait for others.
+/// The time that one statement may wait for others.
 class WaitScope {
  public:
   explicit WaitScope(BusyWait &wait) : wait_(wait) { wait_.StartStatement(); }
@@ -38,7 +38,7 @@ class WaitScope {
   BusyWait &wait_;
 };
 
-// While a statement is stepped: what it writes counts for its transaction.
+/// While a statement is stepped: what it writes counts for its transaction.
 class EffectScope {
  public:
   EffectScope(Durability &durability, Effect effect) : durability_(durability) {
@@ -68,13 +68,13 @@ void AppendRow(sqlite3_stmt *statement, DBResult &result) {
     const bool is_null = sqlite3_column_type(statement, column) == SQLITE_NULL;
     const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(statement, column));
     if (text == nullptr && !is_null) throw std::bad_alloc();
-    const auto size = static_cast<std::size_t>(sqlite3_column_bytes(statement, column));
+    const auto size = static_cast<size_t>(sqlite3_column_bytes(statement, column));
     result.Append(text == nullptr ? std::string_view() : std::string_view(text, size));
   }
 }
 
-// Steps a statement to its end and collects its rows, if it yields columns.
-// Gives an SQLite result code; SQLITE_DONE is success.
+/// Steps a statement to its end and collects its rows, if it yields columns.
+/// Gives an SQLite result code; SQLITE_DONE is success.
 int StepToEnd(sqlite3_stmt *statement, bool wants_rows, ResultPointer &rows) {
   rows.reset();
   int outcome = sqlite3_step(statement);
@@ -86,7 +86,7 @@ int StepToEnd(sqlite3_stmt *statement, bool wants_rows, ResultPointer &rows) {
   return outcome;
 }
 
-// Compiles and runs the first statement of `sql` once.
+/// Compiles and runs the first statement of `sql` once.
 int RunOnce(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants_rows,
             ResultPointer &rows) {
   Statement statement;
@@ -101,8 +101,8 @@ int RunOnce(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants
   return outcome;
 }
 
-// Some locks SQLite does not wait for at all, the one for the switch to WAL among them. Outside of
-// a transaction nothing is lost by running the statement again, so the wait is ours.
+/// Some locks SQLite does not wait for at all, the one for the switch to WAL among them. Outside of
+/// a transaction nothing is lost by running the statement again, so the wait is ours.
 bool RunStatement(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants_rows,
                   ResultPointer &rows) {
   const WaitScope wait(handle.busy_wait);
@@ -118,7 +118,7 @@ bool RunStatement(VELKDBHandle &handle, const char *sql, const char *&rest, bool
   return false;
 }
 
-// `opens_transaction` tells, also on failure, whether a transaction open now is this script's own.
+/// `opens_transaction` tells, also on failure, whether a transaction open now is this script's own.
 bool RunScript(VELKDBHandle &handle, const char *sql, bool wants_rows, ResultPointer &rows,
                bool &opens_transaction) {
   while (*sql != '\0') {
@@ -130,7 +130,7 @@ bool RunScript(VELKDBHandle &handle, const char *sql, bool wants_rows, ResultPoi
   return true;
 }
 
-// Not through the script's own path: the text of the failure is to stay.
+/// Not through the script's own path: the text of the failure is to stay.
 void RollBack(VELKDBHandle &handle) {
   if (!InTransaction(handle)) return;  // some failures have done it already
   const EffectScope effect(handle.durability, Effect::kNone);

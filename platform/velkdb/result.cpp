@@ -16,7 +16,7 @@ bool SameName(const std::string &a, const char *b) {
 
 DBResult_tag::DBResult_tag(const std::vector<std::string> &column_names)
     : width_(column_names.size()) {
-  for (std::size_t index = 0; index < width_; ++index) {
+  for (size_t index = 0; index < width_; ++index) {
     const std::string &name = column_names[index];
     const bool known = std::any_of(columns_.begin(), columns_.end(), [&name](const Column &other) {
       return SameName(other.name, name.c_str());
@@ -43,11 +43,11 @@ const char *DBResult_tag::Text(unsigned int row, const char *column) {
   return found == nullptr ? "" : texts_.data() + offsets_[row * width_ + found->index];
 }
 
-// Readers ask for the columns in the order in which they stand, so the first look mostly hits.
+/// Readers ask for the columns in the order in which they stand, so the first look mostly hits.
 const DBResult_tag::Column *DBResult_tag::FindColumn(const char *name) {
-  const std::size_t count = columns_.size();
-  for (std::size_t step = 0; step < count; ++step) {
-    const std::size_t candidate = (likely_column_ + step) % count;
+  const size_t count = columns_.size();
+  for (size_t step = 0; step < count; ++step) {
+    const size_t candidate = (likely_column_ + step) % count;
     if (!SameName(columns_[candidate].name, name)) continue;
     likely_column_ = (candidate + 1) % count;
     return &columns_[candidate];

@@ -18,7 +18,7 @@ struct DBResult_tag {
   /// Appends the next value of the row being filled; a row is complete with its last column.
   void Append(std::string_view value);
   /// The number of complete rows.
-  std::size_t RowCount() const { return offsets_.size() / width_; }
+  size_t RowCount() const { return offsets_.size() / width_; }
 
   /// Moves on to the next row. @return false when no row is left.
   bool NextRow(unsigned int &row);
@@ -28,17 +28,17 @@ struct DBResult_tag {
  private:
   struct Column {
     std::string name;
-    std::size_t index;  ///< Its place in the row.
+    size_t index;  ///< Its place in the row.
   };
 
   const Column *FindColumn(const char *name);
 
-  std::size_t width_;
+  size_t width_;
   std::vector<Column> columns_;  ///< Of equal names only the first.
   std::string texts_;
-  std::vector<std::size_t> offsets_;  ///< Into texts_, row after row.
+  std::vector<size_t> offsets_;  ///< Into texts_, row after row.
   unsigned int next_row_ = 0;
-  std::size_t likely_column_ = 0;  ///< Into columns_: the one after the last one asked for.
+  size_t likely_column_ = 0;  ///< Into columns_: the one after the last one asked for.
 };
 
 #endif

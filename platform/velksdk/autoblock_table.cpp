@@ -3,12 +3,12 @@
 namespace velk {
 namespace {
 
-// Everything is decided inside the statement, under SQLite's write lock: two processes that count
-// at the same moment cannot both read the old number. A blocked row is left alone and returned
-// to nobody, so only the failure that blocks sees `blocked_until` set.
-//
-// The distance to the first failure counts in both directions: the clock is read before the wait
-// for the lock, so a failure may be stored after one that is a little younger.
+/// Everything is decided inside the statement, under SQLite's write lock: two processes that count
+/// at the same moment cannot both read the old number. A blocked row is left alone and returned
+/// to nobody, so only the failure that blocks sees `blocked_until` set.
+///
+/// The distance to the first failure counts in both directions: the clock is read before the wait
+/// for the lock, so a failure may be stored after one that is a little younger.
 constexpr char kCount[] = R"sql(
   INSERT INTO autoblock AS old
     (address, category, attempts, first_failure, last_failure, blocked_until)
