@@ -81,7 +81,7 @@ TEST_F(CliLink, OptionsThatContradictEachOtherAreRefused) {
   EXPECT_EQ(2, Refused({"--path", "/a", "--app", "{}"}).status);
   EXPECT_EQ(2, Refused({"--match-ip", "--no-match-ip"}).status);
   EXPECT_EQ(2, Refused({"--keep", "--auto-remove"}).status);
-  EXPECT_EQ(2, Refused({"--password-stdin", "--user", OwnName()}).status);
+  EXPECT_EQ(2, Refused({"--password-stdin", "--user", "daemon"}).status);
   EXPECT_EQ(2, Refused({"--password-stdin", "--password-file", "/dev/null"}).status);
   EXPECT_EQ(2, Refused({"--redirect-uri", "/a"}).status);
   EXPECT_EQ(2, Refused({"--redirect", "none", "--redirect-uri", "/a"}).status);
@@ -111,16 +111,16 @@ TEST_F(CliLink, DocumentsMayNestFiveHundredDeep) {
 }
 
 TEST_F(CliLink, PermittedNamesAreKeptAsIds) {
-  const Json::Value link = Show(MakeLink({"--user", OwnName(), "--group", "root"}));
+  const Json::Value link = Show(MakeLink({"--user", "daemon", "--group", "root"}));
   EXPECT_EQ("user", link["protect_type"].asString());
-  EXPECT_EQ(getuid(), link["protect_uids"][0].asUInt());
+  EXPECT_EQ(1u, link["protect_uids"][0].asUInt());
   EXPECT_EQ(0u, link["protect_gids"][0].asUInt());
-  EXPECT_EQ(OwnName(), link["protect_users"][0].asString());
+  EXPECT_EQ("daemon", link["protect_users"][0].asString());
   EXPECT_EQ("root", link["protect_groups"][0].asString());
 }
 
 TEST_F(CliLink, UnknownNamesAreRefusedAndNamed) {
-  const Outcome outcome = Refused({"--user", OwnName(), "--user", "no such", "--user", "nor this"});
+  const Outcome outcome = Refused({"--user", "daemon", "--user", "no such", "--user", "nor this"});
   EXPECT_EQ(1, outcome.status);
   EXPECT_THAT(outcome.err, AllOf(HasSubstr("“no such”, “nor this”"), HasSubstr("never count")));
   EXPECT_EQ(1, Refused({"--group", "no such"}).status);
@@ -179,7 +179,7 @@ TEST_F(CliLink, OpenDropsThePasswordAndItsDigest) {
 }
 
 TEST_F(CliLink, APasswordReplacesPermittedAccounts) {
-  const std::string hash = MakeLink({"--user", OwnName(), "--group", "root"});
+  const std::string hash = MakeLink({"--user", "daemon", "--group", "root"});
   const Json::Value link = RunJson({"link", "set", hash, "--password-stdin"}, "secret\n");
   EXPECT_EQ("password", link["protect_type"].asString());
   EXPECT_EQ(0u, link["protect_uids"].size());
@@ -187,7 +187,7 @@ TEST_F(CliLink, APasswordReplacesPermittedAccounts) {
 }
 
 TEST_F(CliLink, AccountsAndGroupsAreReplacedListByList) {
-  const std::string hash = MakeLink({"--user", OwnName(), "--group", "root"});
+  const std::string hash = MakeLink({"--user", "daemon", "--group", "root"});
   EXPECT_EQ(0, Run({"link", "set", hash, "--no-users"}).status);
   EXPECT_EQ(0u, Show(hash)["protect_uids"].size());
   EXPECT_EQ(1u, Show(hash)["protect_gids"].size());

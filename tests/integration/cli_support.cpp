@@ -1,8 +1,8 @@
 #include "integration/cli_support.h"
 
 #include <json/reader.h>
+#include <poll.h>
 #include <pty.h>
-#include <pwd.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -12,7 +12,8 @@
 namespace velk_test {
 namespace {
 
-const char *const kProgram = VELK_BINARY_DIR "/bin/velksharing";
+constexpr char kProgram[] = VELK_BINARY_DIR "/bin/velksharing";
+constexpr int kPatience = 20000;  // milliseconds
 
 void ClearRoot() {
   RemoveSharingDatabase();
@@ -29,8 +30,10 @@ std::string WithoutNewline(const std::string &text) {
   return text.substr(0, text.find('\n'));
 }
 
-/// @return false at the end of what the terminal shows.
+/// @return false at the end of what the terminal shows, or when it shows nothing for long.
 bool ReadMore(int terminal, std::string &shown) {
+  pollfd waiting = {terminal, POLLIN, 0};
+  if (poll(&waiting, 1, kPatience) != 1) return false;
   char bytes[1024];
   const ssize_t count = read(terminal, bytes, sizeof bytes);
   if (count <= 0) return false;
@@ -86,10 +89,6 @@ std::string CommandLine::StateOf(const std::string &hash) {
   return RunJson({"link", "show", hash})["state"].asString();
 }
 
-std::string CommandLine::OwnName() {
-  return getpwuid(getuid())->pw_name;
-}
-
 void CommandLine::Damage(const std::string &hash) {
   RawDatabase(SharingDatabasePath())
       .Run("UPDATE entry SET data = 'no JSON' WHERE hash = '" + hash + "'");
@@ -121,8 +120,8 @@ Outcome RunOnTerminal(const std::vector<std::string> &arguments,
   while (ReadMore(terminal, outcome.out)) {
   }
   int status = 0;
+  close(terminal);  // Hangs up on a program that still waits for an answer.
   waitpid(child, &status, 0);
-  close(terminal);
   outcome.status = WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
   return outcome;
 }

@@ -42,9 +42,6 @@ class CommandLine : public testing::Test {
   /// The member "state" of a link.
   static std::string StateOf(const std::string &hash);
 
-  /// The name of the account that runs this test.
-  static std::string OwnName();
-
   /// Damages the stored data of a link.
   static void Damage(const std::string &hash);
 };
