@@ -75,7 +75,9 @@ void PrintLink(const Entry &link) {
 ExitStatus Create(const LinkOptions &options, const Request &request) {
   LinkChange change = options.ToChange();
   if (!change.owner_uid) change.owner_uid = getuid();
-  const Entry link = CreateLink(SharingDatabase(), change);
+  SharingDB &db = SharingDatabase();
+  change.password = options.ReadPassword();
+  const Entry link = CreateLink(db, change);
   if (request.json)
     PrintJson(ToJson(link));
   else
@@ -94,8 +96,11 @@ void AddCreate(CLI::App &group, Request &request) {
 }
 
 ExitStatus Change(const std::string &hash, const LinkOptions &options, const Request &request) {
-  const LinkChange change = options.ToChange();
-  const Entry link = ChangeLink(SharingDatabase(), hash, change);
+  LinkChange change = options.ToChange();
+  SharingDB &db = SharingDatabase();
+  FindLink(db, hash);  // Nobody shall type a password for a link that cannot be changed.
+  change.password = options.ReadPassword();
+  const Entry link = ChangeLink(db, hash, change);
   if (request.json)
     PrintJson(ToJson(link));
   else
@@ -140,7 +145,7 @@ struct ListOptions {
   PageOptions page;
 };
 
-const std::map<std::string, LinkOrder> ORDERS = {
+const std::map<std::string, LinkOrder> kOrders = {
     {"id", BY_ID},
     {"hash", BY_HASH},
     {"project", BY_PROJECT},
@@ -156,7 +161,7 @@ LinkQuery ToQuery(const ListOptions &options) {
   query.project = options.project.value();
   if (options.owner.given()) query.owner_uid = ResolveAccount(*options.owner.value());
   query.state = LinkStateFromName(options.state);
-  query.order = ORDERS.at(options.order);
+  query.order = kOrders.at(options.order);
   query.descending = options.descending;
   query.page = options.page.ToPage();
   return query;
@@ -197,7 +202,7 @@ void AddList(CLI::App &group, Request &request) {
   command->add_option("--state", options->state, "Only links in this state")
       ->check(CLI::IsMember({"active", "pending", "used-up", "expired", "disabled"}));
   command->add_option("--sort", options->order, "Order by this field; id when not given")
-      ->check(CLI::IsMember(ORDERS));
+      ->check(CLI::IsMember(kOrders));
   command->add_flag("--desc", options->descending, "Largest first");
   options->page.AddTo(*command);
 }

@@ -128,13 +128,15 @@ LinkChange LinkOptions::ToChange() const {
   return change;
 }
 
+std::optional<Secret> LinkOptions::ReadPassword() const {
+  return ask_password_ ? AskNewSecret("Password of the link") : password_source_.Read();
+}
+
 void LinkOptions::ReadProtection(LinkChange &change) const {
   change.open = open_;
   change.allow_unknown = allow_unknown_;
   if (!users_.empty() || no_users_) change.users = users_;
   if (!groups_.empty() || no_groups_) change.groups = groups_;
-  change.password = password_source_.Read();
-  if (ask_password_) change.password = AskNewSecret("Password of the link");
 }
 
 void LinkOptions::ReadLimits(LinkChange &change) const {

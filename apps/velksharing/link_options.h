@@ -2,6 +2,7 @@
 #define VELKSHARING_CLI_LINK_OPTIONS_H
 
 #include <CLI/CLI.hpp>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -21,9 +22,13 @@ class LinkOptions {
 
   CLI::Option *project() const { return project_.option(); }
 
-  /// What the options ask for; reads or asks for the password where one is wanted.
+  /// What the options ask for, but for the password.
   /// @throws operations::Failure.
   operations::LinkChange ToChange() const;
+
+  /// The password where one is wanted: read, or asked for.
+  /// @throws operations::Failure.
+  std::optional<Secret> ReadPassword() const;
 
  private:
   void AddIdentity(CLI::App &command);

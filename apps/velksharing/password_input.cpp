@@ -85,23 +85,35 @@ class SilentTerminal {
   struct termios before_ = {};
 };
 
+void Append(Secret &line, char byte) {
+  if (line.Append(byte)) return;
+  throw Failure(Failure::INVALID,
+                "the secret is longer than " + std::to_string(Secret::kCapacity) + " bytes");
+}
+
+/// @return false at the end of the file.
+bool ReadByte(int file, char &byte) {
+  for (;;) {
+    const ssize_t count = read(file, &byte, 1);
+    if (count >= 0) return count == 1;
+    if (errno != EINTR || caught_signal != 0) throw SystemFailure("the secret could not be read");
+  }
+}
+
 /// Byte by byte, so that nothing of the secret stays in a buffer and nothing behind it is taken.
 /// @return false when the file ended before its first byte.
 bool ReadLine(int file, Secret &line) {
   bool any = false;
+  bool held_return = false;  // A "\r" that belongs to the line's end if "\n" comes next.
   char byte = 0;
-  for (;;) {
-    const ssize_t count = read(file, &byte, 1);
-    if (count < 0 && errno == EINTR && caught_signal == 0) continue;
-    if (count < 0) throw SystemFailure("the secret could not be read");
-    if (count == 0) break;
+  while (ReadByte(file, byte)) {
     any = true;
-    if (byte == '\n') break;
-    if (!line.Append(byte))
-      throw Failure(Failure::INVALID,
-                    "the secret is longer than " + std::to_string(Secret::kCapacity) + " bytes");
+    if (byte == '\n') return true;
+    if (held_return) Append(line, '\r');
+    held_return = byte == '\r';
+    if (!held_return) Append(line, byte);
   }
-  byte = 0;
+  if (held_return) Append(line, '\r');
   return any;
 }
 

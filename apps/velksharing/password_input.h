@@ -8,7 +8,8 @@
 #include "operations/secret.h"
 
 /// Passwords and session identifiers from where no other user of the machine can see them: never
-/// from an argument. All throw Failure: INVALID for an unfit text, SYSTEM when it cannot be read.
+/// from an argument. A line ends with "\n" or "\r\n". All throw Failure: INVALID for an unfit text,
+/// SYSTEM when it cannot be read.
 
 namespace command_line {
 
@@ -20,10 +21,10 @@ Secret AskSecret(const std::string &question);
 /// Asks twice, until both answers are the same; gives up after three times.
 Secret AskNewSecret(const std::string &question);
 
-/// The first line of standard input, without its newline.
+/// The first line of standard input, without its end.
 Secret ReadSecretFromInput();
 
-/// The first line of a file, without its newline.
+/// The first line of a file, without its end.
 Secret ReadSecretFromFile(const std::string &path);
 
 /// --password-stdin and --password-file, at most one.

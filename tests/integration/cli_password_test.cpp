@@ -34,6 +34,22 @@ TEST_F(CliPassword, IsTheFirstLineOfAFile) {
   EXPECT_TRUE(Opens(MakeLink({"--password-file", folder.File("password")}), "secret"));
 }
 
+TEST_F(CliPassword, ALineMayEndAsOnWindows) {
+  const TempDir folder;
+  WriteFile(folder.File("password"), "secret\r\nmore\r\n");
+  EXPECT_TRUE(Opens(MakeLink({"--password-file", folder.File("password")}), "secret"));
+  EXPECT_TRUE(Opens(MakeLink({"--password-stdin"}, "secret\n"), "secret\r\n"));
+  const std::string longest(4096, 'x');
+  EXPECT_TRUE(Opens(MakeLink({"--password-stdin"}, longest + "\r\n"), longest));
+}
+
+TEST_F(CliPassword, AnyOtherCarriageReturnBelongsToIt) {
+  EXPECT_TRUE(Opens(MakeLink({"--password-stdin"}, "sec\rret\n"), "sec\rret"));
+  EXPECT_FALSE(Opens(MakeLink({"--password-stdin"}, "secret\r"), "secret"));
+  EXPECT_TRUE(Opens(MakeLink({"--password-stdin"}, "secret\r"), "secret\r\r\n"));
+  EXPECT_FALSE(Opens(MakeLink({"--password-stdin"}, "secret\r\r\n"), "secret"));
+}
+
 TEST_F(CliPassword, AFileThatCannotBeReadIsNamed) {
   const Outcome outcome =
       Run({"link", "create", "--project", "files", "--password-file", "/no/such/file"});
@@ -43,7 +59,8 @@ TEST_F(CliPassword, AFileThatCannotBeReadIsNamed) {
 
 TEST_F(CliPassword, UnfitPasswordsAreRefused) {
   for (const std::string &password :
-       {std::string(), std::string("\n"), std::string("a\0b\n", 4), std::string(4097, 'x')})
+       {std::string(), std::string("\n"), std::string("\r\n"), std::string("a\0b\n", 4),
+        std::string(4097, 'x'), std::string(4096, 'x') + "\r"})
     EXPECT_EQ(2,
               Run({"link", "create", "--project", "files", "--password-stdin"}, password).status);
   EXPECT_TRUE(
@@ -64,6 +81,31 @@ TEST_F(CliPassword, IsAskedForTwiceWithoutEcho) {
   EXPECT_EQ(0, outcome.status);
   EXPECT_THAT(outcome.out, Not(HasSubstr("secret")));
   const std::string hash = RunJson({"link", "list"})["links"][0]["hash"].asString();
+  EXPECT_TRUE(Opens(hash, "secret"));
+}
+
+TEST_F(CliPassword, IsNotAskedForWhenTheLinkIsUnknown) {
+  const Outcome outcome = RunOnTerminal({"link", "set", "nosuch", "--password"}, {});
+  EXPECT_EQ(1, outcome.status);
+  EXPECT_THAT(outcome.out, HasSubstr("there is no link “nosuch”"));
+  EXPECT_THAT(outcome.out, Not(HasSubstr("Password")));
+}
+
+TEST_F(CliPassword, IsNotAskedForWhenTheDatabaseIsUnusable) {
+  WriteFile(velk_test::SharingDatabasePath(), std::string(8192, 'x'));
+  for (const Arguments &command :
+       {Arguments{"link", "set", "aB3xK9pQ2"}, Arguments{"link", "create", "--project", "files"}}) {
+    Arguments asking = command;
+    asking.push_back("--password");
+    const Outcome outcome = RunOnTerminal(asking, {});
+    EXPECT_EQ(3, outcome.status);
+    EXPECT_THAT(outcome.out, Not(HasSubstr("Password")));
+  }
+}
+
+TEST_F(CliPassword, ChangesALinkWhenAskedFor) {
+  const std::string hash = MakeLink();
+  EXPECT_EQ(0, RunOnTerminal({"link", "set", hash, "--password"}, {"secret", "secret"}).status);
   EXPECT_TRUE(Opens(hash, "secret"));
 }
 
