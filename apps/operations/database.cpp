@@ -18,7 +18,7 @@ using VELK::sharing::SZF_SHARING_DB_PATH;
 using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 
-constexpr const char *kSchemaFolder = VELK_ROOT "/share/velksharing/db_schema";
+constexpr char kSchemaFolder[] = VELK_ROOT "/share/velksharing/db_schema";
 constexpr int kSchemaVersion = 2;
 
 std::string ErrorText(int error) {

@@ -3,6 +3,7 @@
 #include <iostream>
 #include <memory>
 #include <optional>
+#include <string_view>
 
 #include "command.h"
 #include "output.h"
@@ -31,10 +32,25 @@ bool IsGroup(const CLI::App &app) {
   return !app.get_subcommands([](const CLI::App *) { return true; }).empty();
 }
 
+/// Flags are the only ones without a check of their own that tells what they take.
+std::string ConversionMessage(const std::string &message) {
+  constexpr std::string_view kBefore = "Could not convert: ";
+  if (!message.starts_with(kBefore)) return "an option has a value that it cannot take";
+  // What follows the name may be a secret.
+  return message.substr(kBefore.size(), message.find(" = ") - kBefore.size()) + " takes no value";
+}
+
+std::string MismatchMessage(const std::string &message) {
+  const std::string name = message.substr(0, message.find(':'));
+  return name + (message.ends_with(" missing") ? " needs a value" : " is given more than once");
+}
+
 std::string UsageMessage(const CLI::App &program, const CLI::ParseError &error) {
   const std::string message = error.what();
   if (dynamic_cast<const CLI::ConversionError *>(&error) != nullptr)
-    return message.substr(0, message.find(" = "));
+    return ConversionMessage(message);
+  if (dynamic_cast<const CLI::ArgumentMismatch *>(&error) != nullptr)
+    return MismatchMessage(message);
   const bool missing = dynamic_cast<const CLI::RequiredError *>(&error) != nullptr;
   const bool surplus = dynamic_cast<const CLI::ExtrasError *>(&error) != nullptr;
   if (!missing && !surplus) return message;

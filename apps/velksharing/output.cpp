@@ -11,7 +11,7 @@
 namespace command_line {
 namespace {
 
-constexpr const char *REPLACEMENT = "\uFFFD";
+constexpr char kReplacement[] = "\uFFFD";
 
 /// Marks that make a terminal show text in another order than it is stored.
 bool ChangesDirection(wchar_t character) {
@@ -52,7 +52,7 @@ std::string SafeText(const std::string &text) {
   for (std::size_t i = 0; i < text.size();) {
     const Character next = NextCharacter(text.data() + i, text.size() - i);
     if (next.width < 0)
-      safe += REPLACEMENT;
+      safe += kReplacement;
     else
       safe.append(text, i, next.bytes);
     i += next.bytes;

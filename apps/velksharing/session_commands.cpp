@@ -1,3 +1,4 @@
+#include <climits>
 #include <memory>
 
 #include "command.h"
@@ -66,7 +67,9 @@ void AddDelete(CLI::App &group, Request &request) {
   CLI::App *command =
       AddCommand(group, request, "delete", "Delete sessions: their visitors are logged out",
                  "session delete 17", [ids, &request] { return Delete(*ids, request); });
-  command->add_option("ID", *ids, "Row ids, as the list shows them")->required();
+  command->add_option("ID", *ids, "Row ids, as the list shows them")
+      ->required()
+      ->check(CLI::Range(1, INT_MAX));
 }
 
 }  // namespace

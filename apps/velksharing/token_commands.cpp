@@ -68,7 +68,9 @@ void AddDelete(CLI::App &group, Request &request) {
   CLI::App *command = AddCommand(
       group, request, "delete", "Delete grants: their visitors must log in to that link again",
       "token delete 23", [ids, &request] { return Delete(*ids, request); });
-  command->add_option("ID", *ids, "Row ids, as the list shows them")->required();
+  command->add_option("ID", *ids, "Row ids, as the list shows them")
+      ->required()
+      ->check(CLI::Range(1, INT_MAX));
 }
 
 }  // namespace

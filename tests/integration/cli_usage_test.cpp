@@ -90,6 +90,22 @@ TEST_F(CliUsage, AMistypedCommandIsToldFromAMissingOne) {
   EXPECT_EQ("velksharing: a command is needed; see velksharing link --help\n", Run({"link"}).err);
 }
 
+TEST_F(CliUsage, AnUnfitValueIsToldInPlainWords) {
+  const auto message = [](const Arguments &command) {
+    const std::string err = Run(command).err;
+    return err.substr(0, err.find("; see "));
+  };
+  EXPECT_EQ("velksharing: ID: Value abc not in range 1 to 2147483647",
+            message({"session", "delete", "abc"}));
+  EXPECT_EQ("velksharing: ID: Value 99999999999 not in range 1 to 2147483647",
+            message({"token", "delete", "1", "99999999999"}));
+  EXPECT_EQ("velksharing: --session needs a value", message({"token", "list", "--session="}));
+  EXPECT_EQ("velksharing: --project needs a value", message({"link", "create", "--project"}));
+  EXPECT_EQ("velksharing: --project is given more than once",
+            message({"link", "create", "--project", "a", "--project", "b"}));
+  EXPECT_EQ("velksharing: --json takes no value", message({"link", "list", "--json=maybe"}));
+}
+
 TEST_F(CliUsage, APasswordThatWasGivenAsAnArgumentIsNotRepeated) {
   for (const auto &arguments :
        {Arguments{"--password", "tops3cret"}, Arguments{"--password=tops3cret"},
