@@ -96,9 +96,10 @@ void Copy(sqlite3 *source, sqlite3 *target) {
   int code = backup == nullptr ? sqlite3_errcode(target) : sqlite3_backup_step(backup, -1);
   if (backup != nullptr) sqlite3_backup_finish(backup);
   if (code == SQLITE_DONE) return;
-  if (code == SQLITE_FULL || code == SQLITE_IOERR || code == SQLITE_CANTOPEN)
+  if (code == SQLITE_FULL || code == SQLITE_IOERR || code == SQLITE_CANTOPEN) {
     throw Failure(Failure::SYSTEM,
                   std::string("the copy could not be written: ") + sqlite3_errstr(code));
+  }
   throw Failure(Failure::DATABASE,
                 std::string("the database could not be copied: ") + sqlite3_errstr(code));
 }

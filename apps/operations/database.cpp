@@ -54,9 +54,10 @@ std::string WhyUnreadable() {
 }
 
 std::string WhyUnusable() {
-  if (!MayActAsSystemAccount())
+  if (!MayActAsSystemAccount()) {
     return "only root and the system account (user id " + std::to_string(VELK_SYSTEM_UID) +
            ") may use it";
+  }
   struct stat info = {};
   if (lstat(SZF_SHARING_DB_PATH, &info) != 0)
     return errno == ENOENT ? WhyMissing() : ErrorText(errno);
@@ -88,9 +89,10 @@ std::unique_ptr<BaseDB> OpenForReading() {
   if (!db->IsGood()) throw DatabaseUnusable();
   if (!db->Execute("PRAGMA query_only = ON")) throw Unusable(db->GetLastError());
   const long version = ReadNumber(*db, "SELECT user_version AS n FROM pragma_user_version");
-  if (version < kSchemaVersion)
+  if (version < kSchemaVersion) {
     throw Unusable("its schema has version " + std::to_string(version) +
                    "; a command that changes something brings it up to date");
+  }
   return db;
 }
 

@@ -50,15 +50,17 @@ void SetAccounts(const LinkChange &change, Entry &link) {
   if (change.groups) link.set_protect_groups(*change.groups);
   const Permissions now = StoredPermissions(link);
   if (now.uids.empty() && now.gids.empty() && now.unknown_users.empty() &&
-      now.unknown_groups.empty())
+      now.unknown_groups.empty()) {
     throw Failure(Failure::INVALID, "a link for accounts must permit an account or a group");
+  }
 }
 
 void ApplyProtection(const LinkChange &change, Entry &link) {
   const int kinds = change.open + change.password.has_value() + WantsAccounts(change);
-  if (kinds > 1)
+  if (kinds > 1) {
     throw Failure(Failure::INVALID,
                   "a link is open, or has a password, or is for accounts and groups: choose one");
+  }
   if (change.open) {
     ForgetPassword(link);
     ForgetAccounts(link);

@@ -47,8 +47,9 @@ bool CheckNextLinks(BaseDB &db, int &id, CheckReport &report) {
   Result result;
   if (!db.Execute("SELECT * FROM entry WHERE id > " + std::to_string(id) + " ORDER BY id LIMIT " +
                       std::to_string(kBatch),
-                  result))
+                  result)) {
     throw DatabaseFailure(db, "the links could not be read");
+  }
   bool any = false;
   for (Row row; result.NextRow(row); any = true) {
     id = row.GetField(SZK_ID_).AsInt(id);

@@ -14,8 +14,9 @@ std::string MomentText(long seconds) {
   struct tm parts = {};
   char text[64];
   if (localtime_r(&moment, &parts) == nullptr ||
-      strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts) == 0)
+      strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts) == 0) {
     return "@" + std::to_string(seconds);
+  }
   return text;
 }
 

@@ -49,9 +49,10 @@ template <typename Store>
 void DeleteRow(BaseDB &db, const char *what, int id) {
   if (!Store(db).Delete(id))
     throw DatabaseFailure(db, std::string("the ") + what + " could not be deleted");
-  if (RemovedRows(db) == 0)
+  if (RemovedRows(db) == 0) {
     throw Failure(Failure::NOT_FOUND,
                   std::string("there is no ") + what + " " + std::to_string(id));
+  }
 }
 
 template <typename Store>

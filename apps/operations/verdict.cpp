@@ -47,9 +47,10 @@ Objection CheckBlocked(const std::string &address) {
 Objection CheckTimes(const Entry &link) {
   const long now = Now();
   if (!link.get_enabled()) return Refused("disabled", "the link is disabled");
-  if (link.get_start_at() > now)
+  if (link.get_start_at() > now) {
     return Refused("not-started",
                    "the link has not started; it does at " + MomentText(link.get_start_at()));
+  }
   if (link.get_expire_at() > 0 && now > link.get_expire_at())
     return Refused("expired", "the link expired at " + MomentText(link.get_expire_at()));
   return std::nullopt;
@@ -80,10 +81,11 @@ Verdict WhatLoginAsksFor(const Entry &link) {
   if (link.get_protect_type() != Entry::PROTECT_USER)
     return LetIn("Let in: the link is open to everybody");
   const Permissions permissions = StoredPermissions(link);
-  if (permissions.uids.empty() && permissions.gids.empty())
+  if (permissions.uids.empty() && permissions.gids.empty()) {
     return Refused(
         "nobody-permitted",
         "this machine knew none of the permitted accounts and groups when they were set");
+  }
   return LetIn("Let in with the name and password of a permitted account");
 }
 

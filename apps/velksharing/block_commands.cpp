@@ -26,9 +26,10 @@ ExitStatus List(bool with_failing, const Request &request) {
     return EXIT_DONE;
   }
   Table table({"ADDRESS", "STATE", "FAILURES", "LAST FAILURE", "CATEGORY"});
-  for (const Block &block : blocks)
+  for (const Block &block : blocks) {
     table.AddRow({block.address, StateText(block), std::to_string(block.attempts),
                   MomentText(block.last_failure), block.category});
+  }
   table.Print();
   return EXIT_DONE;
 }

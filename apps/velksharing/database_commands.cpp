@@ -15,9 +15,10 @@ constexpr std::size_t kRowsNamed = 20;
 
 std::string LinksText(const DatabaseStatus &status) {
   std::string text = std::to_string(status.links) + " (";
-  for (std::size_t i = 0; i < kLinkStates.size(); ++i)
+  for (std::size_t i = 0; i < kLinkStates.size(); ++i) {
     text += (i == 0 ? "" : ", ") + std::to_string(status.links_by_state[i]) + " " +
             LinkStateName(kLinkStates[i]);
+  }
   return text + ")";
 }
 
@@ -46,9 +47,10 @@ ExitStatus RunStatus(const Request &request) {
 
 void PrintReport(const CheckReport &report) {
   for (const std::string &problem : report.problems) PrintLine("damage: " + problem);
-  for (std::size_t i = 0; i < std::min(kRowsNamed, report.damaged_links.size()); ++i)
+  for (std::size_t i = 0; i < std::min(kRowsNamed, report.damaged_links.size()); ++i) {
     PrintLine("cannot be loaded: link " + std::to_string(report.damaged_links[i].id) + ", hash " +
               report.damaged_links[i].hash);
+  }
   PrintLine(report.problems.empty() ? "the file is sound" : "the file is damaged");
   PrintLine(Counted(report.links, "link") + ", " + std::to_string(report.damaged_links.size()) +
             " of them cannot be loaded");

@@ -170,11 +170,12 @@ LinkQuery ToQuery(const ListOptions &options) {
 void PrintLinks(const LinkList &list) {
   const long now = Now();
   Table table({"HASH", "PROJECT", "OWNER", "PROTECTION", "STATE", "EXPIRES", "USES", "TITLE"});
-  for (const Entry &link : list.links)
+  for (const Entry &link : list.links) {
     table.AddRow({link.get_hash(), link.get_project_name(), AccountText(link.get_owner_uid()),
                   ProtectTypeName(link.get_protect_type()), LinkStateName(StateOf(link, now)),
                   LimitText(link.get_expire_at(), "never"), UsesText(link),
                   link.get_protect_title()});
+  }
   table.Print();
   PrintLine(std::to_string(list.links.size()) + " of " + Counted(list.total, "link"));
 }
@@ -186,9 +187,10 @@ ExitStatus List(const ListOptions &options, const Request &request) {
     PrintJson(ToJson(list, query.page));
   else
     PrintLinks(list);
-  if (list.damaged != 0)
+  if (list.damaged != 0) {
     PrintError(Counted(list.damaged, "link") +
                " of this page cannot be loaded; “velksharing db check” names them");
+  }
   return EXIT_DONE;
 }
 

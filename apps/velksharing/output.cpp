@@ -39,9 +39,10 @@ std::string Padded(const std::string &text, std::size_t width) {
 
 std::vector<std::size_t> ColumnWidths(const std::vector<std::vector<std::string>> &rows) {
   std::vector<std::size_t> widths(rows.front().size());
-  for (const auto &row : rows)
+  for (const auto &row : rows) {
     for (std::size_t i = 0; i < row.size(); ++i)
       widths[i] = std::max(widths[i], DisplayWidth(row[i]));
+  }
   return widths;
 }
 

@@ -50,10 +50,11 @@ class SignalPostponement {
 class SilentTerminal {
  public:
   SilentTerminal() : file_(open("/dev/tty", O_RDWR | O_CLOEXEC | O_NOCTTY)) {
-    if (file_ < 0)
+    if (file_ < 0) {
       throw Failure(Failure::SYSTEM,
                     "there is no terminal to ask for the password on; use --password-stdin or "
                     "--password-file");
+    }
     if (tcgetattr(file_, &before_) != 0) Close("the terminal could not be read");
     struct termios silent = before_;
     silent.c_lflag &= ~static_cast<tcflag_t>(ECHO);

@@ -22,10 +22,11 @@ struct ListOptions {
 
 void PrintSessions(const SessionList &list) {
   Table table({"ID", "SESSION", "ACCOUNT", "ADDRESS", "LAPSES"});
-  for (const Session &session : list.sessions)
+  for (const Session &session : list.sessions) {
     table.AddRow({std::to_string(session.get_id()), ShortIdentifier(session),
                   AccountText(session.get_uid()), session.get_ip(),
                   MomentText(session.get_timeout())});
+  }
   table.Print();
   PrintLine(std::to_string(list.sessions.size()) + " of " + Counted(list.total, "live session") +
             "; " + std::to_string(list.lapsed) + " lapsed");

@@ -23,9 +23,10 @@ std::optional<Secret> SessionOption::Read() const {
     throw Failure(Failure::INVALID, "--session or --session-file is needed");
   if (identifier_option_->count() == 0) return std::nullopt;
   Secret identifier;
-  for (const char byte : identifier_)
+  for (const char byte : identifier_) {
     if (!identifier.Append(byte))
       throw Failure(Failure::INVALID, "the session's identifier is too long");
+  }
   return identifier;
 }
 

@@ -21,10 +21,11 @@ struct ListOptions {
 
 void PrintGrants(const GrantList &list) {
   Table table({"ID", "LINK", "SESSION", "LAPSES"});
-  for (const Grant &grant : list.grants)
+  for (const Grant &grant : list.grants) {
     table.AddRow(
         {std::to_string(grant.token.get_id()), grant.hash.empty() ? "(deleted)" : grant.hash,
          std::to_string(grant.token.get_session_id()), MomentText(grant.token.get_timeout())});
+  }
   table.Print();
   PrintLine(std::to_string(list.grants.size()) + " of " + Counted(list.total, "live grant") + "; " +
             std::to_string(list.lapsed) + " lapsed");

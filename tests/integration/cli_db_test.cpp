@@ -190,10 +190,11 @@ TEST_F(CliDb, BackupIsConsistentWhileOthersWrite) {
   std::thread writer([&] {
     RawDatabase raw(SharingDatabasePath());
     raw.Run("PRAGMA busy_timeout = 10000");
-    while (!stop)
+    while (!stop) {
       raw.Run(
           "BEGIN IMMEDIATE; INSERT INTO pair VALUES (1, randomblob(5000)); "
           "INSERT INTO pair VALUES (2, randomblob(5000)); COMMIT");
+    }
   });
   for (int i = 0; i < 5; ++i) {
     const std::string copy = folder.File("copy" + std::to_string(i));

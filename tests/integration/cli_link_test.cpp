@@ -95,8 +95,9 @@ TEST_F(CliLink, AnEmptyProjectIsRefused) {
 
 TEST_F(CliLink, DocumentsAreParsedStrictly) {
   for (const char *text : {"", "[]", "1", "null", "{\"a\":1,}", "{} {}", "{'a':1}", "{\"a\":1",
-                           "{\"a\":1,\"a\":2}", "// x\n{}", "{\"a\":NaN}"})
+                           "{\"a\":1,\"a\":2}", "// x\n{}", "{\"a\":NaN}"}) {
     EXPECT_EQ(2, Refused({"--app", text}).status) << text;
+  }
 }
 
 TEST_F(CliLink, DocumentsMayNestFiveHundredDeep) {

@@ -60,9 +60,10 @@ TEST_F(CliPassword, AFileThatCannotBeReadIsNamed) {
 TEST_F(CliPassword, UnfitPasswordsAreRefused) {
   for (const std::string &password :
        {std::string(), std::string("\n"), std::string("\r\n"), std::string("a\0b\n", 4),
-        std::string(4097, 'x'), std::string(4096, 'x') + "\r"})
+        std::string(4097, 'x'), std::string(4096, 'x') + "\r"}) {
     EXPECT_EQ(2,
               Run({"link", "create", "--project", "files", "--password-stdin"}, password).status);
+  }
   EXPECT_TRUE(
       Opens(MakeLink({"--password-stdin"}, std::string(4096, 'x')), std::string(4096, 'x')));
 }

@@ -73,8 +73,9 @@ TEST_F(CliTime, WhatIsNoTimeIsRefused) {
                            "+-7d",
                            "+7y",
                            "+99999999999d",
-                           "2026-03-29 02:30"})
+                           "2026-03-29 02:30"}) {
     EXPECT_EQ(-1, Expiry(text)) << text;
+  }
 }
 
 TEST_F(CliTime, DetailsShowLocalTime) {
