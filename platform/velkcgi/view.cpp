@@ -2,9 +2,7 @@
 
 #include <utility>
 
-#include "common/address.h"
 #include "common/no_throw.h"
-#include "common/text.h"
 #include "parameters.h"
 #include "request.h"
 #include "velk/velkcgi.h"
@@ -46,11 +44,7 @@ int VelkCgiSetCookies(VelkCgi *cgi, const char *name, const char *value, long, c
 }
 
 int VelkCgiGetRemoteIP(char *out, size_t capacity) {
-  return NoThrow(-1, [&] {
-    const auto address = velk::ParseAddress(velk::RequestVariable("REMOTE_ADDR"));
-    if (!address) return -1;
-    return velk::CopyText(velk::PrintAddress(*address), out, capacity) ? 0 : -1;
-  });
+  return VELKAddressNormalize(velk::RequestVariable("REMOTE_ADDR"), out, capacity);
 }
 
 int VelkCgiIsDeniedIP(const char *ip) {

@@ -78,6 +78,18 @@ VELK_PLATFORM_API const char *VLIBCSzHashName(const VLIBCSzHash *list, size_t in
 /// Frees a list. Accepts null.
 VELK_PLATFORM_API void VLIBCSzHashFree(VLIBCSzHash *list);
 
+/// The one spelling of an address that the platform uses for visitors: printed by the C library, an
+/// IPv4 address written as IPv6 as IPv4, a zone id dropped.
+/// @param out receives it; 46 bytes suffice.
+/// @return 0, or -1 with `out` left alone: not an address, or no room.
+VELK_PLATFORM_API int VELKAddressNormalize(const char *ip, char *out, size_t capacity);
+
+/// What the calls below count an address as, and VELKAutoBlockList() prints: an IPv4 address, or
+/// the network of an IPv6 address ("2001:db8:1:2::/64"), which stands for itself.
+/// @param out receives it; 49 bytes suffice.
+/// @return 0, or -1 with `out` left alone: neither, or no room.
+VELK_PLATFORM_API int VELKAutoBlockAddress(const char *ip, char *out, size_t capacity);
+
 /// Counts one failed login from an address, and blocks the address when the count reaches the
 /// limit of VELK_ROOT/etc/autoblock.conf (10 failures within 300 seconds block for 86400).
 ///
