@@ -10,6 +10,7 @@ namespace operations {
 namespace {
 
 using namespace VELK::sharing;
+using operations::ToJson;  // beside the forms of this file
 
 template <typename T>
 Json::Value List(const std::vector<T> &items) {
@@ -73,6 +74,13 @@ void AddProtection(const Entry &link, Json::Value &json) {
   json[SZK_PROTECT_EXTRA_GROUPS] = List(permissions.unknown_groups);
 }
 
+template <typename Record>
+Json::Value ToArray(const std::vector<Record> &records) {
+  Json::Value array(Json::arrayValue);
+  for (const Record &record : records) array.append(ToJson(record));
+  return array;
+}
+
 }  // namespace
 
 Json::Value ToJson(const Entry &link) {
@@ -101,31 +109,27 @@ Json::Value ToJson(const Entry &link) {
 Json::Value ToJson(const LinkList &list, const Page &page) {
   Json::Value json = PageJson(list.total, page);
   json["damaged"] = list.damaged;
-  Json::Value &links = json["links"] = Json::arrayValue;
-  for (const Entry &link : list.links) links.append(ToJson(link));
+  json["links"] = ToArray(list.links);
   return json;
 }
 
 Json::Value ToJson(const SessionList &list, const Page &page) {
   Json::Value json = PageJson(list.total, page);
   json["lapsed"] = list.lapsed;
-  Json::Value &sessions = json["sessions"] = Json::arrayValue;
-  for (const Session &session : list.sessions) sessions.append(ToJson(session));
+  json["sessions"] = ToArray(list.sessions);
   return json;
 }
 
 Json::Value ToJson(const GrantList &list, const Page &page) {
   Json::Value json = PageJson(list.total, page);
   json["lapsed"] = list.lapsed;
-  Json::Value &grants = json["tokens"] = Json::arrayValue;
-  for (const Grant &grant : list.grants) grants.append(ToJson(grant));
+  json["tokens"] = ToArray(list.grants);
   return json;
 }
 
 Json::Value ToJson(const std::vector<Block> &blocks) {
   Json::Value json(Json::objectValue);
-  Json::Value &list = json["blocks"] = Json::arrayValue;
-  for (const Block &block : blocks) list.append(ToJson(block));
+  json["blocks"] = ToArray(blocks);
   return json;
 }
 

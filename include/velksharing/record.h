@@ -92,9 +92,11 @@ class VELK_EXPORT Entry {
   Entry &operator=(Entry &&other);
   virtual ~Entry();
 
+  /// The record as a store sees it; valid as long as this.
   record::Object &GetObject();
   const record::Object &GetCObject() const;
 
+  /// The texts of the stored columns, as Object says.
   std::vector<std::string> GetFieldList() const;
   std::map<std::string, std::string> GetFieldMap() const;
 
@@ -242,9 +244,11 @@ class VELK_EXPORT Session {
   Session &operator=(Session &&other);
   virtual ~Session();
 
+  /// The record as a store sees it; valid as long as this.
   record::Object &GetObject();
   const record::Object &GetCObject() const;
 
+  /// The texts of the stored columns, as Object says.
   std::vector<std::string> GetFieldList() const;
   std::map<std::string, std::string> GetFieldMap() const;
   /// Whether identifier and address are set and the session has not lapsed.
@@ -284,9 +288,11 @@ class VELK_EXPORT Token {
   Token &operator=(Token &&other);
   virtual ~Token();
 
+  /// The record as a store sees it; valid as long as this.
   record::Object &GetObject();
   const record::Object &GetCObject() const;
 
+  /// The texts of the stored columns, as Object says.
   std::vector<std::string> GetFieldList() const;
   std::map<std::string, std::string> GetFieldMap() const;
   /// Whether link and session are set and the grant has not lapsed.
