@@ -49,17 +49,15 @@ Token::Kind Lexer::Read(char first) {
 Token::Kind Lexer::ReadWord() {
   const size_t start = at_ - 1;
   while (IsLetter(Peek()) || IsDigit(Peek())) ++at_;
-  // Beyond ASCII and with dollar signs words go on; x'00' is a blob.
+  // x'00' is a blob.
   const bool is_blob = at_ - start == 1 && (text_[start] | ' ') == 'x' && Peek() == '\'';
-  const bool goes_on = Peek() == '$' || (Peek() & '\x80') != 0;
-  return is_blob || goes_on ? Token::kDoubtful : Token::kWord;
+  return is_blob || GoesOn() ? Token::kDoubtful : Token::kWord;
 }
 
 Token::Kind Lexer::ReadInteger() {
   while (IsDigit(Peek())) ++at_;
   // Decimals, exponents, hexadecimals, and what is no number at all.
-  const bool goes_on = Peek() == '.' || Peek() == '$' || IsLetter(Peek()) || (Peek() & '\x80') != 0;
-  return goes_on ? Token::kDoubtful : Token::kInteger;
+  return Peek() == '.' || GoesOn() ? Token::kDoubtful : Token::kInteger;
 }
 
 Token::Kind Lexer::ReadQuoted(char quote, Token::Kind kind) {
@@ -68,7 +66,7 @@ Token::Kind Lexer::ReadQuoted(char quote, Token::Kind kind) {
     if (end == std::string_view::npos) return Token::kDoubtful;
     at_ = end + 1;
   } while (Take(quote));  // doubled, it stands for itself
-  return kind;
+  return GoesOn() ? Token::kDoubtful : kind;
 }
 
 Token::Kind Lexer::ReadOperator(char first) {
@@ -102,6 +100,10 @@ Token::Kind Lexer::ReadOperator(char first) {
     default:
       return Token::kDoubtful;
   }
+}
+
+bool Lexer::GoesOn() const {
+  return IsLetter(Peek()) || IsDigit(Peek()) || Peek() == '$' || (Peek() & '\x80') != 0;
 }
 
 bool Lexer::Take(char expected) {

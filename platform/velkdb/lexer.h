@@ -40,6 +40,9 @@ class Lexer {
   Token::Kind ReadInteger();
   Token::Kind ReadQuoted(char quote, Token::Kind kind);
   Token::Kind ReadOperator(char first);
+  /// Whether a letter, a digit or what SQLite counts as one is next: then what stands before it is
+  /// no number, or in its place a `?` would make another parameter of it.
+  bool GoesOn() const;
   bool Take(char expected);
   char Peek() const { return at_ < text_.size() ? text_[at_] : '\0'; }
 

@@ -31,6 +31,7 @@ struct LiftedText {
 /// assignment, the items of VALUES, the number of OFFSET. Others stay: they may name a column
 /// (SELECT 'a'), a table ('item'.id) or a place (ORDER BY 2), and the planner looks at the number
 /// of LIMIT and at comparisons with 0 and 1.
+/// @param sql holds no zero byte.
 /// @param lifted replaced; its literals refer to `sql`. Left in any state on failure.
 /// @return false when it is not sure of the statement; that is to run as it came. Neither a script
 ///         nor a text with comments, parameters, blobs, decimals or anything else rare is sure.

@@ -108,6 +108,11 @@ TEST_F(VelkDbStatements, WrongOnesAreNotKept) {
               IsEmpty());
 }
 
+TEST_F(VelkDbStatements, ANumberRightBehindATextIsNoNumberOfAParameter) {
+  EXPECT_EQ(connection_->Run("SELECT n FROM item WHERE name = 'five'37"), -1);
+  EXPECT_EQ(connection_->Error(), "near \"37\": syntax error");
+}
+
 TEST_F(VelkDbStatements, LongOnesAreNotKept) {
   std::string sql = "SELECT n FROM item WHERE n = 2";
   while (sql.size() < 8192) sql += " OR n > 100";
