@@ -39,6 +39,7 @@ class SharingDBPrivate;
 class VELK_EXPORT Field {
  public:
   explicit Field(const std::string &text);
+  explicit Field(std::string &&text) noexcept;
   Field(const Field &other);
   Field(Field &&other) noexcept;
   Field &operator=(const Field &other);

@@ -53,16 +53,6 @@ class EffectScope {
   Durability &durability_;
 };
 
-ResultPointer EmptyResult(sqlite3_stmt *statement) {
-  std::vector<std::string> names;
-  for (int column = 0; column < sqlite3_column_count(statement); ++column) {
-    const char *name = sqlite3_column_name(statement, column);
-    if (name == nullptr) throw std::bad_alloc();
-    names.emplace_back(name);
-  }
-  return std::make_unique<DBResult>(names);
-}
-
 void AppendRow(sqlite3_stmt *statement, DBResult &result) {
   if (result.RowCount() == UINT_MAX) throw std::bad_alloc();  // past what a row's number can say
   for (int column = 0; column < sqlite3_column_count(statement); ++column) {
@@ -76,13 +66,14 @@ void AppendRow(sqlite3_stmt *statement, DBResult &result) {
 
 /// Steps a statement to its end and collects its rows, if it yields columns.
 /// Gives an SQLite result code; SQLITE_DONE is success.
-int StepToEnd(sqlite3_stmt *statement, bool wants_rows, ResultPointer &rows) {
+int StepToEnd(Statement &statement, bool wants_rows, ResultPointer &rows) {
+  sqlite3_stmt *const handle = statement.handle.get();
   rows.reset();
-  int outcome = sqlite3_step(statement);
-  // Only now: the first step may have compiled the statement anew, with other columns.
-  if (wants_rows && sqlite3_column_count(statement) > 0) rows = EmptyResult(statement);
-  for (; outcome == SQLITE_ROW; outcome = sqlite3_step(statement)) {
-    if (rows != nullptr) AppendRow(statement, *rows);
+  int outcome = sqlite3_step(handle);
+  const std::shared_ptr<const Columns> columns = wants_rows ? ColumnsOf(statement) : nullptr;
+  if (columns != nullptr) rows = std::make_unique<DBResult>(columns);
+  for (; outcome == SQLITE_ROW; outcome = sqlite3_step(handle)) {
+    if (rows != nullptr) AppendRow(handle, *rows);
   }
   return outcome;
 }
@@ -98,7 +89,7 @@ int RunOnce(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants
 
   const EffectScope effect(handle.durability, statement.effect);
   ResultPointer own_rows;
-  const int outcome = StepToEnd(statement.handle.get(), wants_rows, own_rows);
+  const int outcome = StepToEnd(statement, wants_rows, own_rows);
   if (own_rows != nullptr) rows = std::move(own_rows);
   return outcome;
 }
@@ -109,7 +100,7 @@ int RunBound(VELKDBHandle &handle, Statement &statement, const std::vector<Liter
   const BindingScope binding(statement.handle.get(), values);
   if (binding.outcome() != SQLITE_OK) return binding.outcome();
   const EffectScope effect(handle.durability, statement.effect);
-  const int outcome = StepToEnd(statement.handle.get(), wants_rows, rows);
+  const int outcome = StepToEnd(statement, wants_rows, rows);
   UpdateEffect(handle.durability, statement);
   return outcome;
 }

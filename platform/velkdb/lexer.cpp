@@ -1,24 +1,39 @@
 #include "lexer.h"
 
+#include <array>
+
 namespace velkdb {
 namespace {
 
-bool IsBlank(char c) {
-  return c == ' ' || c == '\t' || c == '\n' || c == '\f' || c == '\r';
+enum CharacterClass : unsigned char {
+  kOtherCharacter,
+  kBlank,
+  kDigit,
+  kLetter,      ///< In ASCII; the underscore is one.
+  kWordBeyond,  ///< Goes on with a word or starts one, which is not looked into: $, beyond ASCII.
+};
+
+constexpr std::array<CharacterClass, 256> MakeClasses() {
+  std::array<CharacterClass, 256> classes{};
+  for (const unsigned char c : {' ', '\t', '\n', '\f', '\r'}) classes[c] = kBlank;
+  for (unsigned char c = '0'; c <= '9'; ++c) classes[c] = kDigit;
+  for (unsigned char c = 'a'; c <= 'z'; ++c) classes[c] = classes[c - ('a' - 'A')] = kLetter;
+  classes['_'] = kLetter;
+  classes['$'] = kWordBeyond;
+  for (size_t c = 0x80; c < classes.size(); ++c) classes[c] = kWordBeyond;
+  return classes;
 }
 
-bool IsDigit(char c) {
-  return c >= '0' && c <= '9';
-}
+constexpr std::array<CharacterClass, 256> kClasses = MakeClasses();
 
-bool IsLetter(char c) {
-  return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '_';
+CharacterClass ClassOf(char c) {
+  return kClasses[static_cast<unsigned char>(c)];
 }
 
 }  // namespace
 
 Token Lexer::Next() {
-  while (IsBlank(Peek())) ++at_;
+  while (ClassOf(Peek()) == kBlank) ++at_;
   const size_t start = at_;
   if (start == text_.size()) return {Token::kEnd, {}};
   const char first = text_[at_++];
@@ -27,8 +42,8 @@ Token Lexer::Next() {
 }
 
 Token::Kind Lexer::Read(char first) {
-  if (IsLetter(first)) return ReadWord();
-  if (IsDigit(first)) return ReadInteger();
+  if (ClassOf(first) == kLetter) return ReadWord();
+  if (ClassOf(first) == kDigit) return ReadInteger();
   switch (first) {
     case '\'':
       return ReadQuoted(first, Token::kText);
@@ -48,14 +63,14 @@ Token::Kind Lexer::Read(char first) {
 
 Token::Kind Lexer::ReadWord() {
   const size_t start = at_ - 1;
-  while (IsLetter(Peek()) || IsDigit(Peek())) ++at_;
+  while (ClassOf(Peek()) == kLetter || ClassOf(Peek()) == kDigit) ++at_;
   // x'00' is a blob.
   const bool is_blob = at_ - start == 1 && (text_[start] | ' ') == 'x' && Peek() == '\'';
   return is_blob || GoesOn() ? Token::kDoubtful : Token::kWord;
 }
 
 Token::Kind Lexer::ReadInteger() {
-  while (IsDigit(Peek())) ++at_;
+  while (ClassOf(Peek()) == kDigit) ++at_;
   // Decimals, exponents, hexadecimals, and what is no number at all.
   return Peek() == '.' || GoesOn() ? Token::kDoubtful : Token::kInteger;
 }
@@ -89,7 +104,7 @@ Token::Kind Lexer::ReadOperator(char first) {
     case '/':  // not a comment
       return Peek() == '*' ? Token::kDoubtful : Token::kOperator;
     case '.':  // not a decimal
-      return IsDigit(Peek()) ? Token::kDoubtful : Token::kOperator;
+      return ClassOf(Peek()) == kDigit ? Token::kDoubtful : Token::kOperator;
     case '+':
     case '*':
     case '%':
@@ -103,7 +118,7 @@ Token::Kind Lexer::ReadOperator(char first) {
 }
 
 bool Lexer::GoesOn() const {
-  return IsLetter(Peek()) || IsDigit(Peek()) || Peek() == '$' || (Peek() & '\x80') != 0;
+  return ClassOf(Peek()) >= kDigit;
 }
 
 bool Lexer::Take(char expected) {

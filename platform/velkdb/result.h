@@ -2,9 +2,12 @@
 #define VELKDB_RESULT_H
 
 #include <cstddef>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
+
+#include "columns.h"
 
 /// The rows of one executed statement, copied out of SQLite.
 ///
@@ -12,13 +15,12 @@
 struct DBResult_tag {
  public:
   /// A result without rows.
-  /// @param column_names in the order of the output; equal names may occur.
-  explicit DBResult_tag(const std::vector<std::string> &column_names);
+  explicit DBResult_tag(std::shared_ptr<const velkdb::Columns> columns);
 
   /// Appends the next value of the row being filled; a row is complete with its last column.
   void Append(std::string_view value);
   /// The number of complete rows.
-  size_t RowCount() const { return offsets_.size() / width_; }
+  size_t RowCount() const { return offsets_.size() / columns_->count(); }
 
   /// Moves on to the next row. @return false when no row is left.
   bool NextRow(unsigned int &row);
@@ -26,19 +28,11 @@ struct DBResult_tag {
   const char *Text(unsigned int row, const char *column);
 
  private:
-  struct Column {
-    std::string name;
-    size_t index;  ///< Its place in the row.
-  };
-
-  const Column *FindColumn(const char *name);
-
-  size_t width_;
-  std::vector<Column> columns_;  ///< Of equal names only the first.
+  std::shared_ptr<const velkdb::Columns> columns_;  ///< At least one.
   std::string texts_;
   std::vector<size_t> offsets_;  ///< Into texts_, row after row.
   unsigned int next_row_ = 0;
-  size_t likely_column_ = 0;  ///< Into columns_: the one after the last one asked for.
+  size_t likely_column_ = 0;
 };
 
 #endif

@@ -38,4 +38,15 @@ void UpdateEffect(const Durability &durability, Statement &statement) {
     statement.effect = EffectOf(statement.handle.get(), durability.Watched());
 }
 
+std::shared_ptr<const Columns> ColumnsOf(Statement &statement) {
+  sqlite3_stmt *const handle = statement.handle.get();
+  if (sqlite3_column_count(handle) == 0) return nullptr;
+  const int recompilations = sqlite3_stmt_status(handle, SQLITE_STMTSTATUS_REPREPARE, 0);
+  if (statement.columns == nullptr || statement.recompilations != recompilations) {
+    statement.columns = std::make_shared<const Columns>(handle);
+    statement.recompilations = recompilations;
+  }
+  return statement.columns;
+}
+
 }  // namespace velkdb

@@ -3,6 +3,7 @@
 
 #include <memory>
 
+#include "columns.h"
 #include "durability.h"
 
 struct sqlite3;
@@ -19,6 +20,8 @@ using StatementPointer = std::unique_ptr<sqlite3_stmt, StatementDeleter>;
 struct Statement {
   StatementPointer handle;  ///< Null for blanks and comments.
   Effect effect = Effect::kNone;
+  std::shared_ptr<const Columns> columns;  ///< Null until ColumnsOf() has been asked.
+  int recompilations = 0;                  ///< By SQLite, until then.
 };
 
 /// How long a compiled statement is meant to be used.
@@ -33,6 +36,9 @@ int Prepare(sqlite3 *connection, Durability &durability, const char *sql, Use us
 /// Brings the effect of a statement that has just been stepped up to date: SQLite prepares a
 /// statement anew when the schema has changed, and then it may write something else.
 void UpdateEffect(const Durability &durability, Statement &statement);
+
+/// The columns of a statement that has been stepped; null when it yields none.
+std::shared_ptr<const Columns> ColumnsOf(Statement &statement);
 
 }  // namespace velkdb
 

@@ -57,15 +57,17 @@ class BaseDBPrivate {
     return false;
   }
 
-  std::string Escape(const std::string &text) const {
+  /// Appends what Escape() gives.
+  void AppendEscaped(std::string &sql, const std::string &text) const {
+    const size_t start = sql.size();
+    const size_t capacity = 2 * text.size();
     // One byte more than the escaper may fill, so that there is always a terminating zero.
-    std::string buffer(2 * text.size() + 1, '\0');
-    if (VELKDBEscapeStringEX2(0, buffer.data(), 2 * text.size(), text.data(), text.size()) == -1) {
+    sql.resize(start + capacity + 1);
+    if (VELKDBEscapeStringEX2(0, &sql[start], capacity, text.data(), text.size()) == -1) {
       LogError(kSource, "%s:%d (%u) escape failed\n\n");
-      return "";
+      sql[start] = '\0';
     }
-    buffer.resize(buffer.find('\0'));
-    return buffer;
+    sql.resize(sql.find('\0', start));
   }
 
  private:
@@ -167,14 +169,18 @@ bool BaseDB::Vacuum() {
 }
 
 std::string BaseDB::Escape(const std::string &text) const {
-  return private_->Escape(text);
+  std::string escaped;
+  private_->AppendEscaped(escaped, text);
+  return escaped;
 }
 
 bool BaseDB::Insert(const std::string &table, const std::vector<std::string> &values) {
   std::string sql = "INSERT INTO " + table + " VALUES (NULL,";
   const char *separator = "'";
   for (const std::string &value : values) {
-    sql.append(separator).append(Escape(value)).append("'");
+    sql += separator;
+    private_->AppendEscaped(sql, value);
+    sql += '\'';
     separator = ",'";
   }
   sql += ")";
@@ -187,7 +193,11 @@ bool BaseDB::Update(const std::string &table, const std::map<std::string, std::s
   const char *separator = "";
   for (const auto &[column, value] : columns) {
     if (column == SZK_ID_) continue;
-    sql.append(separator).append(Escape(column)).append("='").append(Escape(value)).append("'");
+    sql += separator;
+    private_->AppendEscaped(sql, column);
+    sql += "='";
+    private_->AppendEscaped(sql, value);
+    sql += '\'';
     separator = ",";
   }
   sql += " WHERE id=" + std::to_string(id);

@@ -1,3 +1,5 @@
+#include <optional>
+
 #include "internal/log.h"
 #include "velksharing/store.h"
 
@@ -12,29 +14,29 @@ constexpr char kSource[] = "object_db";
 
 class ObjectDBPrivate {
  public:
-  ObjectDBPrivate(BaseDB &db, const char *table)
-      : db_(db), table_(table == nullptr ? "" : table), condition_(db) {}
+  ObjectDBPrivate(BaseDB &db, const char *table) : db_(db), table_(table == nullptr ? "" : table) {}
 
   BaseDB &db() { return db_; }
   const std::string &table() const { return table_; }
-  Condition &condition() { return condition_; }
+  /// Made when it is first asked for: most stores are made for one record.
+  Condition &condition() { return condition_ ? *condition_ : condition_.emplace(db_); }
 
   /// Runs "SELECT `columns` FROM" the table for the rows that the condition admits, and clears the
   /// condition, whatever the outcome.
   bool Select(const char *columns, Result &result) {
     std::string sql = "SELECT ";
     sql.append(columns).append(" FROM ").append(table_);
-    if (condition_.IsEmpty()) return db_.Execute(sql, result);
-    sql += condition_.GetSQL();
+    if (!condition_ || condition_->IsEmpty()) return db_.Execute(sql, result);
+    sql += condition_->GetSQL();
     const bool done = db_.Execute(sql, result);
-    condition_.Clear();
+    condition_->Clear();
     return done;
   }
 
  private:
   BaseDB &db_;
   const std::string table_;
-  Condition condition_;
+  std::optional<Condition> condition_;
 };
 
 ObjectDB::ObjectDB(BaseDB &db, const char *table)
@@ -101,8 +103,8 @@ bool ObjectDB::Query(std::vector<T> &out) const {
   out.clear();
   Row row;
   while (result.NextRow(row)) {
-    T record;
-    if (record.FromRow(row)) out.push_back(std::move(record));
+    // Loaded where it stays: moving a record copies its JSON.
+    if (!out.emplace_back().FromRow(row)) out.pop_back();
   }
   return true;
 }

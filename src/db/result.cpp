@@ -58,6 +58,7 @@ T Convert(const std::string &text, T def, bool &used_up) {
 }  // namespace
 
 Field::Field(const std::string &text) : text_(text) {}
+Field::Field(std::string &&text) noexcept : text_(std::move(text)) {}
 Field::Field(const Field &other) = default;
 Field::Field(Field &&other) noexcept = default;
 Field &Field::operator=(const Field &other) = default;
@@ -116,7 +117,7 @@ void Row::SetRow(unsigned int row) {
 }
 
 Field Row::GetField(const std::string &name) const {
-  return Field(IsGood() ? VELKDBFetchField(result_, row_, name.c_str()) : "");
+  return Field(std::string(IsGood() ? VELKDBFetchField(result_, row_, name.c_str()) : ""));
 }
 
 Result::Result() = default;

@@ -89,6 +89,13 @@ void Load(std::vector<std::string> &items, const Json::Value &data, const char *
   }
 }
 
+/// Takes the member out, for it may be large. An absent one gives the empty value of a type.
+Json::Value TakeMember(Json::Value &data, const char *key, Json::ValueType absent) {
+  Json::Value member(absent);
+  data.removeMember(key, &member);
+  return member;
+}
+
 }  // namespace
 
 EntryPrivate::EntryPrivate(EntryPrivate &&other)
@@ -202,7 +209,7 @@ Json::Value EntryPrivate::DataToJson() const {
   return data;
 }
 
-void EntryPrivate::DataFromJson(const Json::Value &data) {
+void EntryPrivate::DataFromJson(Json::Value &data) {
   enable_match_ip_ = BoolMember(data, SZK_ENABLE_MATCH_IP);
   protect_type_ = ProtectTypeOf(TextMember(data, SZK_PROTECT_TYPE));
   protect_title_ = TextMember(data, SZK_PROTECT_TITLE);
@@ -215,9 +222,8 @@ void EntryPrivate::DataFromJson(const Json::Value &data) {
   Load(protect_extra_groups_, data, SZK_PROTECT_EXTRA_GROUPS);
   redirect_type_ = RedirectTypeOf(TextMember(data, SZK_REDIRECT_TYPE));
   redirect_uri_ = TextMember(data, SZK_REDIRECT_URI);
-  app_ = data[SZK_APP];
-  private_data_ =
-      data.isMember(SZK_PRIVATE_DATA) ? data[SZK_PRIVATE_DATA] : Json::Value(Json::objectValue);
+  app_ = TakeMember(data, SZK_APP, Json::nullValue);
+  private_data_ = TakeMember(data, SZK_PRIVATE_DATA, Json::objectValue);
 }
 
 }  // namespace VELK::sharing::record

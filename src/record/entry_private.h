@@ -82,7 +82,8 @@ class EntryPrivate : public Object {
  private:
   void CopyPlainFields(const EntryPrivate &other);
   Json::Value DataToJson() const;
-  void DataFromJson(const Json::Value &data);
+  /// Takes what it can use over from `data`. Throws Json::LogicError for members of other types.
+  void DataFromJson(Json::Value &data);
 };
 
 }  // namespace VELK::sharing::record
