@@ -102,8 +102,9 @@ Link NewLink(const Content &content) {
   link.hash = RandomText(kLettersAndDigits, kHashLength);
   link.project_name = content.project_name;
   link.owner_uid = content.owner_uid;
+  link.auto_gc = true;
   const std::string salt = RandomText(kLettersAndDigits, kSaltLength);
-  link.data["enable_match_ip"] = false;
+  link.data["enable_match_ip"] = true;
   link.data["protect_type"] = "password";
   link.data["protect_title"] = content.title;
   link.data["protect_password"] = Digest(kPassword, salt);

@@ -64,6 +64,10 @@ Measurement MedianOfBaseline(const Case &measured) {
   return MedianOf(measured, &Round::baseline);
 }
 
+std::span<const Operation> AllOperations() {
+  return kOperations;
+}
+
 std::vector<Case> AllCases(const std::vector<long> &link_counts) {
   std::vector<Case> cases;
   for (const Operation &operation : kOperations) {

@@ -1,6 +1,7 @@
 #ifndef BENCH_CASES_H
 #define BENCH_CASES_H
 
+#include <span>
 #include <string>
 #include <vector>
 
@@ -47,6 +48,9 @@ struct Case {
 double MedianRatio(const Case &measured);
 Measurement MedianOfLibrary(const Case &measured);
 Measurement MedianOfBaseline(const Case &measured);
+
+/// Everything that can be measured.
+std::span<const Operation> AllOperations();
 
 /// Everything that is measured at these numbers of links.
 std::vector<Case> AllCases(const std::vector<long> &link_counts);

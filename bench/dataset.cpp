@@ -26,8 +26,9 @@ constexpr size_t kHashLength = 9;
 constexpr size_t kSessionLength = 32;
 constexpr std::array kProjects = {kPurgedProject, "files", "notes", "music", "video"};
 constexpr unsigned int kFirstOwner = 1026;
-constexpr unsigned int kOwners = 20;
+constexpr unsigned int kOwners = 10;
 constexpr long kDay = 86400;
+constexpr long kTimeLeft = 36000;  // less than a renewal gives
 
 /// Numbers without a pattern, always the same for the same seed (splitmix64).
 class Scatter {
@@ -110,7 +111,7 @@ void Fill(Connection &connection, long links) {
   const long now = time(nullptr);
   connection.Run("BEGIN");
   for (long id = 1; id <= links; ++id) {
-    const long timeout = IsLive(id) ? now + kDay : now - kDay;
+    const long timeout = IsLive(id) ? now + kTimeLeft : now - kDay;
     InsertLink(link, id, now);
     InsertSession(session, id, timeout);
     InsertGrant(grant, id, timeout);

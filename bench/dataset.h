@@ -16,7 +16,7 @@ namespace velk_bench {
 
 inline constexpr char kPassword[] = "open sesame 2026";  ///< Of every link.
 inline constexpr char kVisitorAddress[] = "192.0.2.10";  ///< Of every session.
-inline constexpr unsigned int kPurgedOwner = 1030;       ///< Has a hundredth of the links
+inline constexpr unsigned int kPurgedOwner = 1030;       ///< Has a fiftieth of the links
 inline constexpr char kPurgedProject[] = "photo";        ///< together with this.
 inline constexpr int kLinksOfAPage = 1000;
 

@@ -7,6 +7,7 @@
 #include <exception>
 
 #include "cases.h"
+#include "equivalence.h"
 #include "options.h"
 #include "report.h"
 #include "round.h"
@@ -78,6 +79,7 @@ bool Initialize(Options &options) {
 int Measure(Options options) {
   if (!Initialize(options)) return 2;
   Stage stage;
+  velk_bench::RequireSameEffects(stage);
   std::vector<Case> cases = velk_bench::AllCases(options.link_counts);
   Register(cases, options.seconds, stage);
   Report report(cases);

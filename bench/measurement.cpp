@@ -12,7 +12,7 @@ constexpr double kMicrosecondsOfSecond = 1e6;
 constexpr double kBytesOfMegabyte = 1024 * 1024;
 
 template <typename T>
-void Append(std::string &bytes, const T &value) {
+void Put(std::string &bytes, const T &value) {
   bytes.append(reinterpret_cast<const char *>(&value), sizeof value);
 }
 
@@ -46,14 +46,23 @@ void DivideByCalls(Measurement &sums, double calls) {
 
 }  // namespace
 
+void Append(Work &work, const Work &later) {
+  work.user_seconds += later.user_seconds;
+  work.system_seconds += later.system_seconds;
+  work.written_bytes += later.written_bytes;
+  work.resident_bytes = std::max(work.resident_bytes, later.resident_bytes);
+  work.errors += later.errors;
+  work.samples.insert(work.samples.end(), later.samples.begin(), later.samples.end());
+}
+
 std::string Packed(const Work &work) {
   std::string bytes;
-  Append(bytes, work.user_seconds);
-  Append(bytes, work.system_seconds);
-  Append(bytes, work.written_bytes);
-  Append(bytes, work.resident_bytes);
-  Append(bytes, work.errors);
-  for (const Sample &sample : work.samples) Append(bytes, sample);
+  Put(bytes, work.user_seconds);
+  Put(bytes, work.system_seconds);
+  Put(bytes, work.written_bytes);
+  Put(bytes, work.resident_bytes);
+  Put(bytes, work.errors);
+  for (const Sample &sample : work.samples) Put(bytes, sample);
   return bytes;
 }
 

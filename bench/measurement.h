@@ -23,6 +23,9 @@ struct Work {
   std::vector<Sample> samples;      ///< One for each call, failed ones included.
 };
 
+/// Adds what another process did after it.
+void Append(Work &work, const Work &later);
+
 /// For the pipe between two processes of this program.
 std::string Packed(const Work &work);
 Work Unpacked(const std::string &bytes);

@@ -130,7 +130,8 @@ std::vector<std::string> RunTogether(int count, const ProcessBody &body) {
 }
 
 void RunApart(const std::function<void()> &body) {
-  RunTogether(1, [&body](int, const std::function<void()> &) {
+  RunTogether(1, [&body](int, const std::function<void()> &wait) {
+    wait();
     body();
     return std::string();
   });

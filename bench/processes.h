@@ -7,8 +7,8 @@
 
 namespace velk_bench {
 
-/// What a process does: gets ready, calls `wait` once, which returns when all processes are ready,
-/// does its work and returns what its parent is to know. Throwing ends the process.
+/// What a process does: gets ready; calls `wait` once, which returns when all processes are ready;
+/// does its work; returns what its parent is to know. Throwing ends the process.
 using ProcessBody = std::function<std::string(int number, const std::function<void()> &wait)>;
 
 /// Runs `body` in `count` forked processes, numbered from 0, at the same time.

@@ -102,6 +102,10 @@ bool Statement::NextRow() {
   throw SqliteError(sqlite3_errmsg(connection_.handle()));
 }
 
+int Statement::ColumnCount() const {
+  return sqlite3_column_count(handle_);
+}
+
 std::int64_t Statement::Number(int column) const {
   return sqlite3_column_int64(handle_, column);
 }

@@ -87,6 +87,7 @@ class Statement {
   /// Moves to the next row; false when there is none.
   bool NextRow();
 
+  int ColumnCount() const;
   /// Columns count from 0. A text is valid until the next call of NextRow() or Reset().
   std::int64_t Number(int column) const;
   std::string_view Text(int column) const;
