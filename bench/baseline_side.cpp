@@ -1,5 +1,3 @@
-#include <velksharing/constants.h>
-
 #include <cstdlib>
 #include <ctime>
 #include <vector>
@@ -7,6 +5,7 @@
 #include "baseline_link.h"
 #include "operations.h"
 #include "sqlite.h"
+#include "stage.h"
 
 namespace velk_bench {
 namespace {
@@ -286,7 +285,7 @@ class BaselineSide : public Operations {
 }  // namespace
 
 std::unique_ptr<Operations> OpenBaseline() {
-  return std::make_unique<BaselineSide>(VELK::sharing::SZF_SHARING_DB_PATH);
+  return std::make_unique<BaselineSide>(BaselineDatabase());
 }
 
 }  // namespace velk_bench

@@ -26,7 +26,7 @@ struct Operation {
   bool also_with_four;  ///< Measured with four processes, too.
 };
 
-/// Both sides, measured one right after the other on the same rows.
+/// Both sides, measured in turns on the same rows.
 struct Round {
   Measurement library;
   Measurement baseline;

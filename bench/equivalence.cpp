@@ -1,13 +1,11 @@
 #include "equivalence.h"
 
-#include <velksharing/constants.h>
-
 #include <cstdlib>
 #include <stdexcept>
 
 #include "cases.h"
-#include "processes.h"
 #include "sqlite.h"
+#include "team.h"
 
 namespace velk_bench {
 namespace {
@@ -29,8 +27,8 @@ constexpr const char *kContents[] = {
     " CASE WHEN timeout > strftime('%s', 'now') + 80000 THEN 'renewed' ELSE timeout END, id"
     " FROM token ORDER BY id"};
 
-std::string Contents() {
-  Connection connection(VELK::sharing::SZF_SHARING_DB_PATH);
+std::string Contents(const std::string &database) {
+  Connection connection(database);
   std::string contents;
   for (const char *sql : kContents) {
     Statement rows(connection, sql);
@@ -52,16 +50,12 @@ void CallSome(const Operation &operation, Operations &side) {
   }
 }
 
-std::string ContentsAfter(const Operation &operation, std::unique_ptr<Operations> (*open)(),
-                          Stage &stage) {
-  stage.Set(kLinks);
-  stage.Spoil();
-  return RunTogether(1, [&](int, const std::function<void()> &wait) {
-    wait();
+std::string ContentsAfter(const Operation &operation, OpenSide open, const std::string &database) {
+  return RunApart([&operation, open, &database] {
     setenv("REMOTE_ADDR", kVisitorAddress, 1);
     CallSome(operation, *open());
-    return Contents();
-  })[0];
+    return Contents(database);
+  });
 }
 
 std::string FirstDifference(const std::string &library, const std::string &baseline) {
@@ -82,8 +76,10 @@ std::string FirstDifference(const std::string &library, const std::string &basel
 void RequireSameEffects(Stage &stage) {
   for (const Operation &operation : AllOperations()) {
     if (!operation.writes) continue;
-    const std::string library = ContentsAfter(operation, OpenLibrary, stage);
-    const std::string baseline = ContentsAfter(operation, OpenBaseline, stage);
+    stage.Set(kLinks);
+    stage.Spoil();
+    const std::string library = ContentsAfter(operation, OpenLibrary, LibraryDatabase());
+    const std::string baseline = ContentsAfter(operation, OpenBaseline, BaselineDatabase());
     if (library == baseline) continue;
     throw std::runtime_error(std::string("the sides do not do the same: ") + operation.name + "\n" +
                              FirstDifference(library, baseline));

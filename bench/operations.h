@@ -7,7 +7,7 @@
 
 namespace velk_bench {
 
-/// What is measured: the same work done by one of two sides, on the one sharing database.
+/// What is measured: the same work done by one of two sides, each on its own copy of a database.
 ///
 /// A side is made in the process that uses it, for SQLite's connections do not survive a fork. Each
 /// call returns whether it did its work; the baseline's calls may also throw SqliteError.
@@ -40,10 +40,12 @@ class Operations {
   virtual bool PurgeGrants() = 0;
 };
 
-/// The library, by its public headers. Once for each process.
+using OpenSide = std::unique_ptr<Operations> (*)();
+
+/// The library, by its public headers, on the sharing database. Once for each process.
 std::unique_ptr<Operations> OpenLibrary();
 
-/// SQLite and JsonCpp by themselves.
+/// SQLite and JsonCpp by themselves, on a database of its own beside that.
 std::unique_ptr<Operations> OpenBaseline();
 
 }  // namespace velk_bench

@@ -1,50 +1,78 @@
 #include "round.h"
 
-#include "processes.h"
 #include "worker.h"
 
 namespace velk_bench {
 namespace {
 
-using Open = std::unique_ptr<Operations> (*)();
+constexpr int kTurns = 10;
+constexpr double kWarmUpShare = 0.5;
 
-/// How often a single call is measured, each time in a new process on the same rows: a short one
-/// alone says little.
-int TriesOfSingleCall(long links) {
-  if (links <= 10000) return 9;
-  return links <= 100000 ? 3 : 1;
+/// What each process of the two sides did.
+struct Works {
+  std::vector<Work> library;
+  std::vector<Work> baseline;
+};
+
+std::vector<Work> Finish(Team &team) {
+  std::vector<Work> works;
+  for (const std::string &report : team.Finish()) works.push_back(Unpacked(report));
+  return works;
 }
 
-std::vector<Work> RunOnce(const Case &measured, double seconds, Open open, Stage &stage) {
+/// Who begins changes from turn to turn.
+void TakeTurns(Team &library, Team &baseline, int turns, bool library_begins) {
+  for (int turn = 0; turn < turns; ++turn) {
+    Team &first = library_begins ? library : baseline;
+    Team &second = library_begins ? baseline : library;
+    first.Turn();
+    second.Turn();
+    library_begins = !library_begins;
+  }
+}
+
+Works Run(const Case &measured, double seconds, bool library_begins, Stage &stage) {
+  const auto team_of = [&](OpenSide open) {
+    return [&measured, seconds, open](int number) {
+      return MakeWorker({measured.operation, measured.links, number, measured.processes,
+                         kWarmUpShare * seconds, seconds / kTurns, open});
+    };
+  };
   stage.Set(measured.links);
   if (measured.operation->writes) stage.Spoil();
-  const auto reports =
-      RunTogether(measured.processes, [&](int number, const std::function<void()> &wait) {
-        return Packed(Measure(
-            {measured.operation, measured.links, number, measured.processes, seconds, open}, wait));
-      });
-  std::vector<Work> processes;
-  for (const std::string &report : reports) processes.push_back(Unpacked(report));
-  return processes;
+  Team library(measured.processes, team_of(OpenLibrary));
+  Team baseline(measured.processes, team_of(OpenBaseline));
+  TakeTurns(library, baseline, measured.operation->extent == Extent::kOnce ? 1 : kTurns,
+            library_begins);
+  return {Finish(library), Finish(baseline)};
 }
 
-Measurement MeasureSide(const Case &measured, double seconds, Open open, Stage &stage) {
-  std::vector<Work> processes = RunOnce(measured, seconds, open, stage);
-  if (measured.operation->extent != Extent::kOnce) return Summary(processes);
-  for (int tries = TriesOfSingleCall(measured.links); tries > 1; --tries)
-    Append(processes[0], RunOnce(measured, seconds, open, stage)[0]);
-  return Summary(processes);
+/// How often a single call is measured, each time in new processes on the same rows: a short one
+/// alone says little.
+int TriesOfSingleCall(long links) {
+  if (links <= 10000) return 10;
+  return links <= 100000 ? 4 : 1;
+}
+
+Works RunSingleCalls(const Case &measured, bool library_begins, Stage &stage) {
+  Works works = Run(measured, 0, library_begins, stage);
+  for (int tries = TriesOfSingleCall(measured.links); tries > 1; --tries) {
+    library_begins = !library_begins;
+    const Works more = Run(measured, 0, library_begins, stage);
+    Append(works.library[0], more.library[0]);
+    Append(works.baseline[0], more.baseline[0]);
+  }
+  return works;
 }
 
 }  // namespace
 
 Round MeasureRound(const Case &measured, double seconds, Stage &stage) {
-  Round round;
-  const bool library_first = measured.rounds.size() % 2 == 0;
-  if (library_first) round.library = MeasureSide(measured, seconds, OpenLibrary, stage);
-  round.baseline = MeasureSide(measured, seconds, OpenBaseline, stage);
-  if (!library_first) round.library = MeasureSide(measured, seconds, OpenLibrary, stage);
-  return round;
+  const bool library_begins = measured.rounds.size() % 2 == 0;
+  const Works works = measured.operation->extent == Extent::kOnce
+                          ? RunSingleCalls(measured, library_begins, stage)
+                          : Run(measured, seconds, library_begins, stage);
+  return {Summary(works.library), Summary(works.baseline)};
 }
 
 }  // namespace velk_bench

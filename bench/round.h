@@ -6,8 +6,8 @@
 
 namespace velk_bench {
 
-/// Measures both sides of a case once, right after each other. Which goes first changes from round
-/// to round. Throws when a process fails.
+/// Measures both sides of a case once. They take turns of a tenth of the time, so that whatever
+/// else the machine does meanwhile meets both. Throws when a process fails.
 /// @param seconds that each side is called.
 Round MeasureRound(const Case &measured, double seconds, Stage &stage);
 

@@ -9,30 +9,20 @@
 
 #include "dataset.h"
 #include "flush_counter.h"
-#include "processes.h"
+#include "team.h"
 
 namespace velk_bench {
 namespace {
 
 const std::string kFolder = VELK_BENCH_FOLDER;
 
-std::string SharingDatabase() {
-  return VELK::sharing::SZF_SHARING_DB_PATH;
+void RemoveJournals(const std::string &database) {
+  for (const char *suffix : {"-wal", "-shm"}) std::filesystem::remove(database + suffix);
 }
 
-void RemoveJournals() {
-  for (const char *suffix : {"-wal", "-shm"}) std::filesystem::remove(SharingDatabase() + suffix);
-}
-
-void RemoveSharingDatabase() {
-  std::filesystem::remove(SharingDatabase());
-  RemoveJournals();
-}
-
-/// A login looks into the file of blocked addresses; there is none.
-void RemoveBlocks() {
-  for (const char *suffix : {"", "-wal", "-shm"})
-    std::filesystem::remove(std::string(VELK_ROOT "/etc/private/autoblock.db") + suffix);
+void RemoveDatabase(const std::string &database) {
+  std::filesystem::remove(database);
+  RemoveJournals(database);
 }
 
 void FlushFile(const std::string &path) {
@@ -42,12 +32,19 @@ void FlushFile(const std::string &path) {
   if (!flushed) throw std::runtime_error("cannot flush " + path);
 }
 
-std::string MasterCopy(long links) {
+/// The file on the disk, and its name.
+void FlushNew(const std::string &path) {
+  FlushFile(path);
+  FlushFile(std::filesystem::path(path).parent_path());
+}
+
+std::string Master(long links) {
   const std::string path = kFolder + "/sharing-" + std::to_string(links) + ".db";
   if (std::filesystem::exists(path)) return path;
   RunApart([&path, links] {
     MakeDatabase(path + ".new", links);
     std::filesystem::rename(path + ".new", path);
+    return std::string();
   });
   return path;
 }
@@ -55,11 +52,11 @@ std::string MasterCopy(long links) {
 }  // namespace
 
 Stage::Stage() {
-  if (SharingDatabase().rfind(VELK_BINARY_DIR "/", 0) != 0)
-    throw std::runtime_error(SharingDatabase() + " is not this build's, and may be in use");
+  if (LibraryDatabase().rfind(VELK_BINARY_DIR "/", 0) != 0)
+    throw std::runtime_error(LibraryDatabase() + " is not this build's, and may be in use");
   std::filesystem::remove_all(kFolder);
   std::filesystem::create_directories(kFolder);
-  RemoveBlocks();
+  RemoveDatabase(VELK_ROOT "/etc/private/autoblock.db");  // a login looks into it; there is none
   RequireFlushesAreCounted(kFolder.c_str());
 }
 
@@ -67,17 +64,29 @@ Stage::~Stage() {
   std::error_code ignored;
   std::filesystem::remove_all(kFolder, ignored);
   for (const char *suffix : {"", "-wal", "-shm"})
-    std::filesystem::remove(SharingDatabase() + suffix, ignored);
+    std::filesystem::remove(LibraryDatabase() + suffix, ignored);
 }
 
 void Stage::Set(long links) {
-  if (links_ == links) return RemoveJournals();
-  const std::string master = MasterCopy(links);
-  RemoveSharingDatabase();
-  std::filesystem::copy_file(master, SharingDatabase());
-  FlushFile(SharingDatabase());
-  FlushFile(std::filesystem::path(SharingDatabase()).parent_path());
+  const bool are_set = links_ == links;
+  Spoil();  // unless all of this goes well
+  const std::string master = Master(links);
+  for (const std::string &database : {LibraryDatabase(), BaselineDatabase()}) {
+    RemoveJournals(database);
+    if (are_set) continue;
+    RemoveDatabase(database);
+    std::filesystem::copy_file(master, database);
+    FlushNew(database);
+  }
   links_ = links;
+}
+
+std::string LibraryDatabase() {
+  return VELK::sharing::SZF_SHARING_DB_PATH;
+}
+
+std::string BaselineDatabase() {
+  return kFolder + "/baseline.db";
 }
 
 }  // namespace velk_bench

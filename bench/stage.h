@@ -5,10 +5,10 @@
 
 namespace velk_bench {
 
-/// The sharing database that both sides are measured on: before each run the same one again.
+/// The databases that the sides are measured on: before each run the same two again.
 ///
-/// There is one database for each number of links, made when it is first asked for and taken away
-/// at the end. Each run gets a copy of it, on the disk before the run starts. All of this is in the
+/// There is one master for each number of links, made when it is first asked for and taken away at
+/// the end. Each side gets a copy of it, on the disk before the run starts. All of this is in the
 /// build folder, and the constructor throws when the library's database is not.
 class Stage {
  public:
@@ -17,15 +17,19 @@ class Stage {
   Stage &operator=(const Stage &) = delete;
   ~Stage();
 
-  /// Puts a database of `links` links where the library looks for it.
+  /// Puts databases of `links` links where the sides look for them. No process may have them open.
   void Set(long links);
 
-  /// The last run has written: the database is not what it was.
+  /// The databases are not what they were made as any more.
   void Spoil() { links_ = 0; }
 
  private:
-  long links_ = 0;  ///< In the database that is there now, when it is as it was made.
+  long links_ = 0;  ///< In the databases that are there now; 0 for none that can be used.
 };
+
+/// Where the sides look.
+std::string LibraryDatabase();
+std::string BaselineDatabase();
 
 }  // namespace velk_bench
 

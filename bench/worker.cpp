@@ -18,7 +18,6 @@ namespace {
 using Clock = std::chrono::steady_clock;
 
 constexpr int kWarmUpCallsOfSupply = 10;  // what is used up then is not there to be measured
-constexpr double kWarmUpShare = 0.5;      // of the time that is measured
 
 /// The live links of one process, each once and then again from the start.
 class Turns {
@@ -56,22 +55,25 @@ std::int64_t MostResidentBytes() {
   return 1024 * ProcessFigure("/proc/self/status", "VmHWM:");
 }
 
+Clock::duration Duration(double seconds) {
+  return std::chrono::duration_cast<Clock::duration>(std::chrono::duration<double>(seconds));
+}
+
 double Seconds(const timeval &time) {
   return static_cast<double>(time.tv_sec) + 1e-6 * static_cast<double>(time.tv_usec);
 }
 
-/// Turns what a process has used so far into what it uses from the construction on.
+/// What a process uses from the construction on.
 class Meter {
  public:
   Meter() : written_(WrittenBytes()) { getrusage(RUSAGE_SELF, &usage_); }
 
-  void ReadTo(Work &work) const {
+  void AddTo(Work &work) const {
     rusage now{};
     getrusage(RUSAGE_SELF, &now);
-    work.user_seconds = Seconds(now.ru_utime) - Seconds(usage_.ru_utime);
-    work.system_seconds = Seconds(now.ru_stime) - Seconds(usage_.ru_stime);
-    work.written_bytes = WrittenBytes() - written_;
-    work.resident_bytes = MostResidentBytes();
+    work.user_seconds += Seconds(now.ru_utime) - Seconds(usage_.ru_utime);
+    work.system_seconds += Seconds(now.ru_stime) - Seconds(usage_.ru_stime);
+    work.written_bytes += WrittenBytes() - written_;
   }
 
  private:
@@ -79,58 +81,74 @@ class Meter {
   rusage usage_{};
 };
 
-bool CallOnce(const Operation &operation, Operations &side, long id) {
-  try {
-    return operation.call(side, id);
-  } catch (const std::exception &) {
-    return false;
+class Worker : public Member {
+ public:
+  explicit Worker(const Task &task)
+      : task_(task), turns_(task.links, task.number, task.processes), side_(task.open()) {
+    WarmUp();
   }
-}
 
-void WarmUp(const Task &task, Operations &side, Turns &turns) {
-  if (task.operation->extent == Extent::kOnce) {
-    side.ReadForCheck(VisitOf(turns.Next()));  // opens the log
-    return;
+  void Turn() override {
+    const Meter meter;
+    const auto end = Clock::now() + Duration(task_.turn_seconds);
+    do {
+      if (IsUsedUp()) break;
+      MeasureCall();
+    } while (task_.operation->extent != Extent::kOnce && Clock::now() < end);
+    meter.AddTo(work_);
   }
-  const bool is_scarce = task.operation->extent == Extent::kTimeOrSupply;
-  const auto end = Clock::now() + std::chrono::duration<double>(kWarmUpShare * task.seconds);
-  for (int call = 0; Clock::now() < end && !(is_scarce && call == kWarmUpCallsOfSupply); ++call)
-    CallOnce(*task.operation, side, turns.Next());
-}
 
-bool IsOver(const Task &task, const Turns &turns, Clock::time_point end) {
-  if (task.operation->extent == Extent::kOnce || Clock::now() >= end) return true;
-  return task.operation->extent == Extent::kTimeOrSupply && turns.HasGoneRound();
-}
+  std::string Report() override {
+    work_.resident_bytes = MostResidentBytes();
+    return Packed(work_);
+  }
 
-void CallUntilOver(const Task &task, Operations &side, Turns &turns, Work &work) {
-  const auto end = Clock::now() + std::chrono::duration_cast<Clock::duration>(
-                                      std::chrono::duration<double>(task.seconds));
-  do {
-    const long id = turns.Next();
+ private:
+  void WarmUp() {
+    if (task_.operation->extent == Extent::kOnce) {
+      side_->ReadForCheck(VisitOf(turns_.Next()));  // opens the log
+      return;
+    }
+    const bool is_scarce = task_.operation->extent == Extent::kTimeOrSupply;
+    const auto end = Clock::now() + Duration(task_.warm_up_seconds);
+    for (int calls = 0; Clock::now() < end && !(is_scarce && calls == kWarmUpCallsOfSupply);
+         ++calls)
+      Call(turns_.Next());
+  }
+
+  bool IsUsedUp() const {
+    return task_.operation->extent == Extent::kTimeOrSupply && turns_.HasGoneRound();
+  }
+
+  void MeasureCall() {
+    const long id = turns_.Next();
     const long flushes = FlushesSoFar();
     const auto start = Clock::now();
-    const bool done = CallOnce(*task.operation, side, id);
+    const bool done = Call(id);
     const std::chrono::nanoseconds spent = Clock::now() - start;
-    work.samples.push_back({spent.count(), FlushesSoFar() - flushes});
-    if (!done) ++work.errors;
-  } while (!IsOver(task, turns, end));
-}
+    work_.samples.push_back({spent.count(), FlushesSoFar() - flushes});
+    if (!done) ++work_.errors;
+  }
+
+  bool Call(long id) {
+    try {
+      return task_.operation->call(*side_, id);
+    } catch (const std::exception &) {
+      return false;
+    }
+  }
+
+  const Task task_;
+  Turns turns_;
+  const std::unique_ptr<Operations> side_;
+  Work work_;
+};
 
 }  // namespace
 
-Work Measure(const Task &task, const std::function<void()> &wait) {
+std::unique_ptr<Member> MakeWorker(const Task &task) {
   setenv("REMOTE_ADDR", kVisitorAddress, 1);
-  Turns turns(task.links, task.number, task.processes);
-  const std::unique_ptr<Operations> side = task.open();
-  WarmUp(task, *side, turns);
-  wait();
-
-  Work work;
-  const Meter meter;
-  CallUntilOver(task, *side, turns, work);
-  meter.ReadTo(work);
-  return work;
+  return std::make_unique<Worker>(task);
 }
 
 }  // namespace velk_bench

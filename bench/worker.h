@@ -1,10 +1,10 @@
 #ifndef BENCH_WORKER_H
 #define BENCH_WORKER_H
 
-#include <functional>
 #include <memory>
 
 #include "cases.h"
+#include "team.h"
 
 namespace velk_bench {
 
@@ -14,13 +14,15 @@ struct Task {
   long links;     ///< In the database.
   int number;     ///< Of this process, from 0, ...
   int processes;  ///< ... and of all.
-  double seconds;
-  std::unique_ptr<Operations> (*open)();
+  double warm_up_seconds;
+  double turn_seconds;
+  OpenSide open;
 };
 
-/// Opens the side, warms up, waits at the barrier and calls the operation: on live links in random
-/// order, the same for both sides, and on other links than the other processes.
-Work Measure(const Task &task, const std::function<void()> &wait);
+/// Opens a side and warms up; then calls the operation as often as a turn has room for, on live
+/// links in random order: the same for both sides, and others than the other processes'. Reports
+/// packed Work.
+std::unique_ptr<Member> MakeWorker(const Task &task);
 
 }  // namespace velk_bench
 
