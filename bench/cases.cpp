@@ -40,6 +40,8 @@ Measurement MedianOf(const Case &measured, Measurement Round::*side) {
     for (const Round &round : measured.rounds) values.push_back(round.*side.*figure.value);
     median.*figure.value = Median(std::move(values));
   }
+  median.errors = 0;  // of these, none may go unseen
+  for (const Round &round : measured.rounds) median.errors += (round.*side).errors;
   return median;
 }
 

@@ -44,7 +44,7 @@ struct Case {
   std::string Name() const;  ///< "check/links:1000/processes:4"
 };
 
-/// The median over the rounds.
+/// The medians over the rounds; of errors, the sum.
 double MedianRatio(const Case &measured);
 Measurement MedianOfLibrary(const Case &measured);
 Measurement MedianOfBaseline(const Case &measured);

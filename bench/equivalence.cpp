@@ -50,10 +50,11 @@ void CallSome(const Operation &operation, Operations &side) {
   }
 }
 
-std::string ContentsAfter(const Operation &operation, OpenSide open, const std::string &database) {
-  return RunApart([&operation, open, &database] {
+std::string ContentsAfter(const Operation &operation, const Side &side,
+                          const std::string &database) {
+  return RunApart([&operation, &side, &database] {
     setenv("REMOTE_ADDR", kVisitorAddress, 1);
-    CallSome(operation, *open());
+    CallSome(operation, *side.open());
     return Contents(database);
   });
 }
@@ -78,8 +79,8 @@ void RequireSameEffects(Stage &stage) {
     if (!operation.writes) continue;
     stage.Set(kLinks);
     stage.Spoil();
-    const std::string library = ContentsAfter(operation, OpenLibrary, LibraryDatabase());
-    const std::string baseline = ContentsAfter(operation, OpenBaseline, BaselineDatabase());
+    const std::string library = ContentsAfter(operation, kLibrary, LibraryDatabase());
+    const std::string baseline = ContentsAfter(operation, kBaseline, BaselineDatabase());
     if (library == baseline) continue;
     throw std::runtime_error(std::string("the sides do not do the same: ") + operation.name + "\n" +
                              FirstDifference(library, baseline));

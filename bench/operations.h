@@ -40,13 +40,19 @@ class Operations {
   virtual bool PurgeGrants() = 0;
 };
 
-using OpenSide = std::unique_ptr<Operations> (*)();
-
 /// The library, by its public headers, on the sharing database. Once for each process.
 std::unique_ptr<Operations> OpenLibrary();
 
 /// SQLite and JsonCpp by themselves, on a database of its own beside that.
 std::unique_ptr<Operations> OpenBaseline();
+
+/// One of the two, by its name.
+struct Side {
+  const char *name;
+  std::unique_ptr<Operations> (*open)();
+};
+inline constexpr Side kLibrary = {"library", OpenLibrary};
+inline constexpr Side kBaseline = {"baseline", OpenBaseline};
 
 }  // namespace velk_bench
 

@@ -71,11 +71,11 @@ void Report::PrintCases() {
     std::vector<std::string> first = {measured.operation->name,
                                       NumberText(static_cast<double>(measured.links)),
                                       std::to_string(measured.processes),
-                                      "library",
+                                      kLibrary.name,
                                       NumberText(library.calls_per_second),
                                       RatioWithSpread(measured)};
-    std::vector<std::string> second = {"", "", "", "SQLite", NumberText(baseline.calls_per_second),
-                                       ""};
+    std::vector<std::string> second = {
+        "", "", "", kBaseline.name, NumberText(baseline.calls_per_second), ""};
     AppendFigures(first, library);
     AppendFigures(second, baseline);
     table.Add(std::move(first));

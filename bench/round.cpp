@@ -32,16 +32,16 @@ void TakeTurns(Team &library, Team &baseline, int turns, bool library_begins) {
 }
 
 Works Run(const Case &measured, double seconds, bool library_begins, Stage &stage) {
-  const auto team_of = [&](OpenSide open) {
-    return [&measured, seconds, open](int number) {
+  const auto team_of = [&](const Side &side) {
+    return [&measured, seconds, side](int number) {
       return MakeWorker({measured.operation, measured.links, number, measured.processes,
-                         kWarmUpShare * seconds, seconds / kTurns, open});
+                         kWarmUpShare * seconds, seconds / kTurns, side});
     };
   };
   stage.Set(measured.links);
   if (measured.operation->writes) stage.Spoil();
-  Team library(measured.processes, team_of(OpenLibrary));
-  Team baseline(measured.processes, team_of(OpenBaseline));
+  Team library(measured.processes, team_of(kLibrary));
+  Team baseline(measured.processes, team_of(kBaseline));
   TakeTurns(library, baseline, measured.operation->extent == Extent::kOnce ? 1 : kTurns,
             library_begins);
   return {Finish(library), Finish(baseline)};

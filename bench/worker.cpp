@@ -1,5 +1,6 @@
 #include "worker.h"
 
+#include <sys/prctl.h>
 #include <sys/resource.h>
 
 #include <algorithm>
@@ -84,7 +85,7 @@ class Meter {
 class Worker : public Member {
  public:
   explicit Worker(const Task &task)
-      : task_(task), turns_(task.links, task.number, task.processes), side_(task.open()) {
+      : task_(task), turns_(task.links, task.number, task.processes), side_(task.side.open()) {
     WarmUp();
   }
 
@@ -147,6 +148,7 @@ class Worker : public Member {
 }  // namespace
 
 std::unique_ptr<Member> MakeWorker(const Task &task) {
+  prctl(PR_SET_NAME, task.side.name);
   setenv("REMOTE_ADDR", kVisitorAddress, 1);
   return std::make_unique<Worker>(task);
 }

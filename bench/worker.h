@@ -16,12 +16,12 @@ struct Task {
   int processes;  ///< ... and of all.
   double warm_up_seconds;
   double turn_seconds;
-  OpenSide open;
+  Side side;
 };
 
 /// Opens a side and warms up; then calls the operation as often as a turn has room for, on live
 /// links in random order: the same for both sides, and others than the other processes'. Reports
-/// packed Work.
+/// packed Work. Names the process after its side, so that profilers tell them apart.
 std::unique_ptr<Member> MakeWorker(const Task &task);
 
 }  // namespace velk_bench
