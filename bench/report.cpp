@@ -43,7 +43,10 @@ bool Report::ReportContext(const Context &context) {
   GetOutputStream() << Today() << ", " << context.cpu_info.num_cpus << " CPUs at "
                     << static_cast<int>(context.cpu_info.cycles_per_second / 1e6) << " MHz, "
                     << system.sysname << ' ' << system.release << ", SQLite "
-                    << sqlite3_libversion() << "\n";
+                    << sqlite3_libversion();
+  if (!context.cpu_info.load_avg.empty())
+    GetOutputStream() << ", load before " << NumberText(context.cpu_info.load_avg[0]);
+  GetOutputStream() << "\n\n";
   return true;
 }
 
