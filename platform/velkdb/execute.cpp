@@ -1,6 +1,9 @@
 #include <sqlite3.h>
 
+#include <array>
+#include <charconv>
 #include <climits>
+#include <limits>
 #include <memory>
 #include <new>
 
@@ -53,14 +56,33 @@ class EffectScope {
   Durability &durability_;
 };
 
+void AppendInteger(sqlite3_int64 number, DBResult &result) {
+  std::array<char, std::numeric_limits<sqlite3_int64>::digits10 + 2> digits;  // one more, a sign
+  const auto [end, error] = std::to_chars(digits.begin(), digits.end(), number);
+  result.Append(std::string_view(digits.data(), static_cast<size_t>(end - digits.data())));
+}
+
+void AppendText(sqlite3_stmt *statement, int column, DBResult &result) {
+  const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(statement, column));
+  if (text == nullptr) throw std::bad_alloc();
+  const auto size = static_cast<size_t>(sqlite3_column_bytes(statement, column));
+  result.Append(std::string_view(text, size));
+}
+
 void AppendRow(sqlite3_stmt *statement, DBResult &result) {
   if (result.RowCount() == UINT_MAX) throw std::bad_alloc();  // past what a row's number can say
-  for (int column = 0; column < sqlite3_column_count(statement); ++column) {
-    const bool is_null = sqlite3_column_type(statement, column) == SQLITE_NULL;
-    const auto *text = reinterpret_cast<const char *>(sqlite3_column_text(statement, column));
-    if (text == nullptr && !is_null) throw std::bad_alloc();
-    const auto size = static_cast<size_t>(sqlite3_column_bytes(statement, column));
-    result.Append(text == nullptr ? std::string_view() : std::string_view(text, size));
+  const int columns = sqlite3_column_count(statement);
+  for (int column = 0; column < columns; ++column) {
+    switch (sqlite3_column_type(statement, column)) {
+      case SQLITE_NULL:
+        result.Append({});
+        break;
+      case SQLITE_INTEGER:  // the same text as SQLite's, sooner
+        AppendInteger(sqlite3_column_int64(statement, column), result);
+        break;
+      default:
+        AppendText(statement, column, result);
+    }
   }
 }
 

@@ -2,10 +2,17 @@
 
 #include "velk/velkdb.h"
 
+namespace {
+
+constexpr size_t kUsualText = 32;  // bytes of one value
+
+}  // namespace
+
 DBResult_tag::DBResult_tag(std::shared_ptr<const velkdb::Columns> columns)
     : columns_(std::move(columns)) {
   // Most results have one row.
   offsets_.reserve(columns_->count());
+  texts_.reserve(columns_->count() * kUsualText);
 }
 
 void DBResult_tag::Append(std::string_view value) {

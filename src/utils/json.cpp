@@ -25,7 +25,8 @@ Json::StreamWriterBuilder CompactStyle() {
 #pragma GCC diagnostic ignored "-Wdeprecated-declarations"
 bool ParseJson(const std::string &text, Json::Value &value, bool collect_comments) {
   try {
-    return Json::Reader().parse(text, value, collect_comments);
+    // From where it lies: given the string itself, the reader copies it.
+    return Json::Reader().parse(text.data(), text.data() + text.size(), value, collect_comments);
   } catch (const Json::Exception &) {  // nested past the reader's limit
     return false;
   }
