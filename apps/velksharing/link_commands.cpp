@@ -223,10 +223,8 @@ ExitStatus Delete(const std::vector<std::string> &hashes, const Request &request
   SharingDB &db = SharingDatabase();
   return ForEach(hashes, request, [&](const std::string &hash) {
     const int grants = DeleteLink(db, hash);
-    Json::Value json(Json::objectValue);
-    json["hash"] = hash;
-    json["tokens"] = grants;
-    return Done{json, hash + " deleted with " + Counted(grants, "grant")};
+    return Done{DeletedLinkToJson(hash, grants),
+                hash + " deleted with " + Counted(grants, "grant")};
   });
 }
 
@@ -279,15 +277,10 @@ ExitStatus Why(const WhyOptions &options, const Request &request) {
   const std::unique_ptr<BaseDB> db = OpenForReading();
   const Verdict verdict = session ? JudgeSession(*db, options.hash, *session, address)
                                   : JudgeLogin(*db, options.hash, address);
-  if (request.json) {
-    Json::Value json(Json::objectValue);
-    json["let_in"] = verdict.let_in;
-    json["reason"] = verdict.reason;
-    json["sentence"] = verdict.sentence;
-    PrintJson(json);
-  } else {
+  if (request.json)
+    PrintJson(ToJson(verdict));
+  else
     PrintLine(verdict.sentence);
-  }
   return verdict.let_in ? EXIT_DONE : EXIT_REFUSED;
 }
 
