@@ -120,6 +120,14 @@ Json::Value DeletedLinkToJson(const std::string &hash, int grants) {
   return json;
 }
 
+Json::Value ToJson(const LinkUrl &link) {
+  Json::Value json(Json::objectValue);
+  json[SZK_HASH] = link.hash;
+  json["url"] = link.url;
+  json["type"] = link.type;
+  return json;
+}
+
 Json::Value ToJson(const Verdict &verdict) {
   Json::Value json(Json::objectValue);
   json["let_in"] = verdict.let_in;

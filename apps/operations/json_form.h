@@ -7,6 +7,7 @@
 #include <string>
 
 #include "operations/blocks.h"
+#include "operations/link_url.h"
 #include "operations/links.h"
 #include "operations/maintenance.h"
 #include "operations/sessions.h"
@@ -22,6 +23,7 @@ Json::Value ToJson(const Entry &link);
 Json::Value ToJson(const LinkList &list, const Page &page);
 /// A link that is gone with so many grants.
 Json::Value DeletedLinkToJson(const std::string &hash, int grants);
+Json::Value ToJson(const LinkUrl &link);
 Json::Value ToJson(const Verdict &verdict);
 Json::Value ToJson(const SessionList &list, const Page &page);
 Json::Value ToJson(const GrantList &list, const Page &page);

@@ -3,6 +3,7 @@
 #include "apis.h"
 #include "errors.h"
 #include "operations/json_form.h"
+#include "operations/link_url.h"
 #include "operations/links.h"
 #include "operations/verdict.h"
 #include "parameters.h"
@@ -197,6 +198,10 @@ Json::Value Purge(Parameters &parameters) {
   return ToJson(PurgeLinksAutomatically(SharingDatabase()));
 }
 
+Json::Value Url(Parameters &parameters) {
+  return ToJson(UrlOfLink(SharingDatabase(), parameters.RequiredText(SZK_HASH)));
+}
+
 Json::Value Why(Parameters &parameters) {
   const std::string hash = parameters.RequiredText(SZK_HASH);
   const std::string address = parameters.Text(SZK_IP_).value_or("");
@@ -234,6 +239,7 @@ Api LinkApi() {
                  "Open descriptor whose first line is the identifier of the visitor's session.", 0,
                  INT_MAX}},
                Why},
+              {"url", "Tells the URL under which visitors reach a link.", one_link, Url},
           }};
 }
 
