@@ -9,6 +9,7 @@ set(VELK_SYSTEM_GID "1" CACHE STRING
 set(VELK_SASLAUTHD_SOCKET "/run/saslauthd/mux" CACHE STRING
     "saslauthd's socket, asked for account passwords where it answers")
 option(VELK_BUILD_TESTS "Build the tests" OFF)
+option(VELK_BUILD_FUZZ_TARGETS "Build the fuzz targets; needs clang" OFF)
 option(VELK_WARNINGS_ARE_ERRORS "Treat warnings in our own code as errors" OFF)
 
 foreach(kind uid gid)

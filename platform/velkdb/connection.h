@@ -6,6 +6,8 @@
 
 #include "busy_wait.h"
 #include "durability.h"
+#include "literals.h"
+#include "statement_cache.h"
 
 struct sqlite3;
 
@@ -22,8 +24,10 @@ struct VELKDBHandle_tag {
   velkdb::BusyWait busy_wait;
   velkdb::Durability durability;
   std::string error;  ///< The text of the last failure.
-  /// Closed first: SQLite calls the two above until then.
+  /// Closed before those above: SQLite calls the first two until then.
   std::unique_ptr<sqlite3, velkdb::ConnectionDeleter> sqlite;
+  velkdb::StatementCache statements;  ///< Of the connection, so it goes before it does.
+  velkdb::LiftedText lifted;          ///< Of the statement being run; kept for its memory.
 };
 
 #endif

@@ -83,14 +83,15 @@ void Durability::Attach(sqlite3 *connection) {
   sqlite3_set_authorizer(connection, OnAction, this);
 }
 
-void Durability::Refresh() {
-  if (current_ || sqlite3_get_autocommit(connection_) == 0) return;
+bool Durability::Refresh() {
+  if (current_ || sqlite3_get_autocommit(connection_) == 0) return false;
   relaxed_.clear();
   std::vector<std::string> names;
   current_ = sqlite3_exec(connection_, "PRAGMA synchronous = NORMAL", nullptr, nullptr, nullptr) ==
                  SQLITE_OK &&
              ReadList(connection_, names);
   if (current_) relaxed_ = std::move(names);
+  return true;
 }
 
 void Durability::Watch() {

@@ -36,11 +36,13 @@ class Durability {
   /// Brings `synchronous` and the list of relaxed tables up to date, when they are not. To be
   /// called outside of any statement. When the file cannot be read now, everything is flushed
   /// and the next call tries again.
-  void Refresh();
+  /// @return whether they were not: then the effects of statements prepared before may no longer
+  ///         hold.
+  bool Refresh();
 
   /// A statement is about to be prepared.
   void Watch();
-  /// What the statement prepared since Watch() writes.
+  /// What was prepared since Watch(), or prepared anew since Start(), writes.
   Effect Watched() const { return seen_; }
 
   /// A statement with this effect is about to be stepped.

@@ -4,6 +4,7 @@
 #include <memory>
 #include <new>
 
+#include "binding.h"
 #include "connection.h"
 #include "result.h"
 #include "statement.h"
@@ -90,7 +91,8 @@ int StepToEnd(sqlite3_stmt *statement, bool wants_rows, ResultPointer &rows) {
 int RunOnce(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants_rows,
             ResultPointer &rows) {
   Statement statement;
-  const int prepared = Prepare(handle.sqlite.get(), handle.durability, sql, statement, rest);
+  const int prepared =
+      Prepare(handle.sqlite.get(), handle.durability, sql, Use::kOnce, statement, rest);
   if (prepared != SQLITE_OK) return prepared;
   if (statement.handle == nullptr) return SQLITE_DONE;
 
@@ -101,21 +103,46 @@ int RunOnce(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants
   return outcome;
 }
 
+/// Runs a compiled statement once with these values.
+int RunBound(VELKDBHandle &handle, Statement &statement, const std::vector<Literal> &values,
+             bool wants_rows, ResultPointer &rows) {
+  const BindingScope binding(statement.handle.get(), values);
+  if (binding.outcome() != SQLITE_OK) return binding.outcome();
+  const EffectScope effect(handle.durability, statement.effect);
+  const int outcome = StepToEnd(statement.handle.get(), wants_rows, rows);
+  UpdateEffect(handle.durability, statement);
+  return outcome;
+}
+
 /// Some locks SQLite does not wait for at all, the one for the switch to WAL among them. Outside of
 /// a transaction nothing is lost by running the statement again, so the wait is ours.
-bool RunStatement(VELKDBHandle &handle, const char *sql, const char *&rest, bool wants_rows,
-                  ResultPointer &rows) {
+/// @param run runs a statement once and gives an SQLite result code; SQLITE_DONE is success.
+template <typename Run>
+bool RunPatiently(VELKDBHandle &handle, const Run &run) {
   const WaitScope wait(handle.busy_wait);
-  handle.durability.Refresh();
+  if (handle.durability.Refresh()) handle.statements.Clear();
   const bool may_repeat = !InTransaction(handle);
-  int outcome = RunOnce(handle, sql, rest, wants_rows, rows);
+  int outcome = run();
   for (int attempt = 0; outcome == SQLITE_BUSY && may_repeat && handle.busy_wait.Sleep(attempt);
        ++attempt) {
-    outcome = RunOnce(handle, sql, rest, wants_rows, rows);
+    outcome = run();
   }
   if (outcome == SQLITE_DONE) return true;
   KeepError(handle, sqlite3_errmsg(handle.sqlite.get()));
   return false;
+}
+
+/// Runs the one statement of `sql`, which has been lifted.
+bool RunLifted(VELKDBHandle &handle, const char *sql, bool wants_rows, ResultPointer &rows) {
+  return RunPatiently(handle, [&] {
+    Statement *const statement =
+        handle.statements.Get(handle.sqlite.get(), handle.durability, handle.lifted.text);
+    if (statement != nullptr)
+      return RunBound(handle, *statement, handle.lifted.literals, wants_rows, rows);
+    // It may not hold values in such places, or it is wrong: then its own text tells how.
+    const char *rest = sql;
+    return RunOnce(handle, sql, rest, wants_rows, rows);
+  });
 }
 
 /// `opens_transaction` tells, also on failure, whether a transaction open now is this script's own.
@@ -124,7 +151,8 @@ bool RunScript(VELKDBHandle &handle, const char *sql, bool wants_rows, ResultPoi
   while (*sql != '\0') {
     opens_transaction = opens_transaction || !InTransaction(handle);
     const char *rest = sql;
-    if (!RunStatement(handle, sql, rest, wants_rows, rows)) return false;
+    if (!RunPatiently(handle, [&] { return RunOnce(handle, sql, rest, wants_rows, rows); }))
+      return false;
     sql = rest;
   }
   return true;
@@ -141,7 +169,9 @@ bool Execute(VELKDBHandle &handle, const char *sql, bool wants_rows, ResultPoint
   bool opens_transaction = false;
   bool done = false;
   try {
-    done = RunScript(handle, sql, wants_rows, rows, opens_transaction);
+    done = LiftLiterals(sql, handle.lifted)
+               ? RunLifted(handle, sql, wants_rows, rows)
+               : RunScript(handle, sql, wants_rows, rows, opens_transaction);
   } catch (const std::bad_alloc &) {
     KeepError(handle, "out of memory");
   }

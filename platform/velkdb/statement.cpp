@@ -19,17 +19,23 @@ void StatementDeleter::operator()(sqlite3_stmt *statement) const {
   sqlite3_finalize(statement);
 }
 
-int Prepare(sqlite3 *connection, Durability &durability, const char *sql, Statement &statement,
-            const char *&rest) {
+int Prepare(sqlite3 *connection, Durability &durability, const char *sql, Use use,
+            Statement &statement, const char *&rest) {
+  const unsigned int flags = use == Use::kOften ? SQLITE_PREPARE_PERSISTENT : 0;
   sqlite3_stmt *handle = nullptr;
   const char *tail = nullptr;
   durability.Watch();
-  const int outcome = sqlite3_prepare_v2(connection, sql, -1, &handle, &tail);
+  const int outcome = sqlite3_prepare_v3(connection, sql, -1, flags, &handle, &tail);
   if (outcome != SQLITE_OK) return outcome;
   statement.handle.reset(handle);
   statement.effect = EffectOf(handle, durability.Watched());
   rest = tail;
   return SQLITE_OK;
+}
+
+void UpdateEffect(const Durability &durability, Statement &statement) {
+  if (durability.Watched() != Effect::kNone)
+    statement.effect = EffectOf(statement.handle.get(), durability.Watched());
 }
 
 }  // namespace velkdb

@@ -177,6 +177,16 @@ TEST_F(VelkDbFlush, ATriggerOfAnotherConnectionCounts) {
       "CREATE TRIGGER counting AFTER UPDATE ON session"
       " BEGIN UPDATE entry SET use_count = use_count + 1; END");
   EXPECT_EQ(FlushesOf("UPDATE session SET timeout='2' WHERE id=1"), 1);
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='3' WHERE id=1"), 1);
+}
+
+TEST_F(VelkDbFlush, ATriggerThatIsGoneCountsNoMore) {
+  Run("CREATE TRIGGER counting AFTER UPDATE ON session"
+      " BEGIN UPDATE entry SET use_count = use_count + 1; END");
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='1' WHERE id=1"), 1);
+  RawDatabase(path_).Run("DROP TRIGGER counting");
+  Run("UPDATE session SET timeout='2' WHERE id=1");
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='3' WHERE id=1"), 0);
 }
 
 TEST_F(VelkDbFlush, AFileWithoutTheListIsAlwaysFlushed) {
@@ -204,6 +214,14 @@ TEST_F(VelkDbFlush, AListChangedByThisConnectionHoldsAtOnce) {
   EXPECT_EQ(FlushesOf(kNewEntry), 0);
   EXPECT_EQ(FlushesOf("DROP TABLE velkdb_relaxed"), 1);
   EXPECT_EQ(FlushesOf(kNewToken), 1);
+}
+
+TEST_F(VelkDbFlush, AChangedListHoldsForStatementsThatHaveRunBefore) {
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='1' WHERE id=1"), 0);
+  Run("BEGIN; DELETE FROM velkdb_relaxed WHERE name = 'session'");
+  Run("UPDATE session SET timeout='2' WHERE id=1");
+  Run("COMMIT");
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='3' WHERE id=1"), 1);
 }
 
 TEST_F(VelkDbFlush, AListChangedAndRolledBackIsAsBefore) {
