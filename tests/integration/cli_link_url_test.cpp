@@ -141,10 +141,12 @@ TEST_F(CliLinkUrl, APictureThatCannotBeMadeLeavesNothing) {
   const std::string hash = MakeLink();
   EXPECT_EQ(2, Run({"link", "url", hash, "--qr-svg", ""}).status);
   EXPECT_EQ(3, Run({"link", "url", hash, "--qr-svg", folder_.File("no/code.svg")}).status);
-  const Outcome outcome =
-      RunProgram({"/bin/sh", "-c",
-                  "trap '' XFSZ; ulimit -f 1; exec " VELK_BINARY_DIR "/bin/velksharing link url " +
-                      hash + " --qr-svg " + folder_.File("code.svg")});
+  // A picture that is larger than what the database needs beside itself.
+  WriteFile(kConfig, "external_host = h\npath = /" + std::string(2000, 'a') + "/\n");
+  const Outcome outcome = RunProgram({"/bin/sh", "-c",
+                                      "trap '' XFSZ; ulimit -f 128; exec " VELK_BINARY_DIR
+                                      "/bin/velksharing link url " +
+                                          hash + " --qr-svg " + folder_.File("code.svg")});
   EXPECT_EQ(3, outcome.status);
   EXPECT_THAT(outcome.err, HasSubstr("code.svg could not be written"));
   EXPECT_TRUE(std::filesystem::is_empty(folder_.path()));

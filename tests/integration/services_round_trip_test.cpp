@@ -1,5 +1,7 @@
 // The library calls the platform's programs, which work through the library on the same database.
 
+#include <json/writer.h>
+
 #include <filesystem>
 
 #include "integration/cli_support.h"
@@ -10,14 +12,25 @@
 namespace {
 
 using namespace VELK::sharing;
+using VELK::sharing::db::BaseDB;
 using VELK::sharing::db::EntryDB;
-using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
 
 const std::string kConfig = VELK_ROOT "/etc/sharing-url.conf";
 constexpr char kLink[] = "VELK.Sharing.Link";
 
-/// ctest gives each test a process of its own; a process has one sharing database.
+/// The links, on a connection of the test's own.
+class Connection {
+ public:
+  Connection() : db_(velk_test::SharingDatabasePath(), 0660), links_(db_) {}
+
+  EntryDB *operator->() { return &links_; }
+
+ private:
+  BaseDB db_;
+  EntryDB links_;
+};
+
 class ServicesRoundTrip : public velk_test::CommandLine {
  protected:
   void TearDown() override {
@@ -59,7 +72,7 @@ TEST_F(ServicesRoundTrip, ALinkThatTheWebApiMakesIsTheLibrarys) {
   const Json::Value made = Sent("create", NewLink());
   const std::string hash = made[SZK_HASH].asString();
   Entry link;
-  ASSERT_TRUE(EntryDB(SharingDB::Instance()).GetByHash(hash, link));
+  ASSERT_TRUE(Connection()->GetByHash(hash, link));
   EXPECT_EQ("it's a \"test\"; $HOME `x` ü", link.get_project_name());
   EXPECT_EQ(0u, link.get_owner_uid());
   EXPECT_FALSE(link.get_enable_match_ip());
@@ -71,10 +84,10 @@ TEST_F(ServicesRoundTrip, ALinkThatTheWebApiMakesIsTheLibrarys) {
 
 TEST_F(ServicesRoundTrip, AChangeOfTheLibrarysIsSeenByTheWebApi) {
   const std::string hash = Sent("create", NewLink())[SZK_HASH].asString();
-  EntryDB links(SharingDB::Instance());
+  Connection links;
   Entry link;
-  ASSERT_TRUE(links.GetByHash(hash, link));
-  ASSERT_TRUE(links.Update(link.set_enabled(false).set_protect_title("closed")));
+  ASSERT_TRUE(links->GetByHash(hash, link));
+  ASSERT_TRUE(links->Update(link.set_enabled(false).set_protect_title("closed")));
   const Json::Value seen = Sent("get", Named(hash));
   EXPECT_FALSE(seen[SZK_ENABLED_].asBool());
   EXPECT_EQ("closed", seen[SZK_PROTECT_TITLE].asString());
@@ -83,14 +96,14 @@ TEST_F(ServicesRoundTrip, AChangeOfTheLibrarysIsSeenByTheWebApi) {
 TEST_F(ServicesRoundTrip, AChangeThroughTheWebApiIsSeenByTheLibrary) {
   Json::Value params = NewLink();
   const std::string hash = Sent("create", params)[SZK_HASH].asString();
-  EntryDB links(SharingDB::Instance());
+  Connection links;
   Entry link;
-  ASSERT_TRUE(links.GetByHash(hash, link));
+  ASSERT_TRUE(links->GetByHash(hash, link));
   params = Named(hash);
   params[SZK_ENABLED_] = false;
   params[SZK_PROTECT_USERS] = R"(["daemon"])";
   Sent("set", params);
-  ASSERT_TRUE(links.GetByHash(hash, link));
+  ASSERT_TRUE(links->GetByHash(hash, link));
   EXPECT_FALSE(link.get_enabled());
   EXPECT_EQ(Entry::PROTECT_USER, link.get_protect_type());
   EXPECT_THAT(link.get_protect_users(), testing::ElementsAre("daemon"));
@@ -98,11 +111,11 @@ TEST_F(ServicesRoundTrip, AChangeThroughTheWebApiIsSeenByTheLibrary) {
 
 TEST_F(ServicesRoundTrip, ALinkThatTheWebApiDeletesIsGone) {
   const std::string hash = Sent("create", NewLink())[SZK_HASH].asString();
-  EntryDB links(SharingDB::Instance());
+  Connection links;
   Entry link;
-  ASSERT_TRUE(links.GetByHash(hash, link));
+  ASSERT_TRUE(links->GetByHash(hash, link));
   Sent("delete", Named(hash));
-  EXPECT_FALSE(links.GetByHash(hash, link));
+  EXPECT_FALSE(links->GetByHash(hash, link));
   EXPECT_EQ(301, Send("get", Named(hash))["error"]["code"].asInt());
 }
 
@@ -142,7 +155,7 @@ TEST_F(ServicesRoundTrip, DocumentsAsDeepAsTheyMayBeComeBack) {
   const std::string hash = Sent("create", params)[SZK_HASH].asString();
   EXPECT_EQ(1u, Sent("list", Json::objectValue)["items"].size());
   Entry link;
-  EXPECT_TRUE(EntryDB(SharingDB::Instance()).GetByHash(hash, link));
+  EXPECT_TRUE(Connection()->GetByHash(hash, link));
 }
 
 TEST_F(ServicesRoundTrip, TheUrlOfALinkComesFromTheProgram) {

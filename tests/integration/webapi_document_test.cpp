@@ -75,7 +75,8 @@ std::string Row(const Json::Value &parameter) {
 
 TEST_F(WebApiDocument, TellsEveryMethodsParameters) {
   std::size_t methods = 0;
-  for (const Json::Value &api : Data("VELK.API.Info", "query")["apis"]) {
+  const Json::Value info = Data("VELK.API.Info", "query");
+  for (const Json::Value &api : info["apis"]) {
     EXPECT_EQ(1, api["version"].asInt());
     for (const Json::Value &method : api["methods"]) {
       const std::string section = api["api"].asString() + " " + method["method"].asString();
@@ -96,7 +97,8 @@ TEST_F(WebApiDocument, TellsEveryMethodsParameters) {
 
 TEST_F(WebApiDocument, TellsEveryError) {
   Lines expected;
-  for (const Json::Value &error : Data("VELK.API.Info", "query")["errors"]) {
+  const Json::Value info = Data("VELK.API.Info", "query");
+  for (const Json::Value &error : info["errors"]) {
     expected.push_back("| " + error["code"].asString() + " | `" + error["name"].asString() +
                        "` | " + error["meaning"].asString() + " |");
   }

@@ -1,6 +1,8 @@
 #ifndef TESTS_INTEGRATION_WEBAPI_SUPPORT_H
 #define TESTS_INTEGRATION_WEBAPI_SUPPORT_H
 
+#include <json/writer.h>
+
 #include "integration/cli_support.h"
 
 namespace velk_test {
