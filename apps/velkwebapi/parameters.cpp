@@ -28,13 +28,16 @@ std::string Quoted(const std::string &name) {
   return "“" + name + "”";
 }
 
+bool HasParameter(const Method &method, const std::string &name) {
+  return std::any_of(method.parameters.begin(), method.parameters.end(),
+                     [&](const Parameter &parameter) { return parameter.name == name; });
+}
+
 void CheckNames(const Method &method, const Request &request) {
   std::set<std::string> seen;
   for (const auto &[name, text] : request.parameters) {
-    const bool known =
-        std::any_of(method.parameters.begin(), method.parameters.end(),
-                    [&](const Parameter &parameter) { return parameter.name == name; });
-    if (!known) throw Refusal(UNKNOWN_PARAMETER, method.name + " has no parameter " + Quoted(name));
+    if (!HasParameter(method, name))
+      throw Refusal(UNKNOWN_PARAMETER, method.name + " has no parameter " + Quoted(name));
     if (!seen.insert(name).second)
       throw Refusal(DUPLICATE_PARAMETER, "parameter " + Quoted(name) + " is given more than once");
   }
