@@ -46,3 +46,17 @@ function(velk_platform_library name)
   set_target_properties(${name} PROPERTIES VERSION 1.0.0 SOVERSION 1)
   velk_shared_library(${name} ${PROJECT_SOURCE_DIR}/platform/exports.map)
 endfunction()
+
+# velk_platform_program(NAME): one of the programs that the library runs, at VELK_ROOT/bin. A local
+# root gets it as soon as it is built.
+function(velk_platform_program name)
+  file(RELATIVE_PATH libraries "${VELK_ROOT}/bin" "${CMAKE_INSTALL_FULL_LIBDIR}")
+  set_target_properties(${name} PROPERTIES INSTALL_RPATH "$ORIGIN/${libraries}")
+  target_compile_definitions(${name} PRIVATE VELKSHARING_VERSION="${PROJECT_VERSION}")
+  install(TARGETS ${name} RUNTIME DESTINATION "${VELK_ROOT}/bin")
+  if(VELK_ROOT_IS_LOCAL)
+    add_custom_command(TARGET ${name} POST_BUILD VERBATIM
+      COMMAND ${CMAKE_COMMAND} -E make_directory "${VELK_ROOT}/bin"
+      COMMAND ${CMAKE_COMMAND} -E copy_if_different "$<TARGET_FILE:${name}>" "${VELK_ROOT}/bin")
+  endif()
+endfunction()

@@ -3,6 +3,7 @@
 #include <json/reader.h>
 #include <json/writer.h>
 
+#include <algorithm>
 #include <memory>
 
 #include "operations/failure.h"
@@ -24,7 +25,7 @@ std::string OneLine(const std::string &report) {
   return line;
 }
 
-bool Parse(const std::string &text, Json::Value &value, std::string &report) {
+bool ReadStrictly(const std::string &text, Json::Value &value, std::string &report) {
   Json::CharReaderBuilder builder;
   Json::CharReaderBuilder::strictMode(&builder.settings_);
   builder["stackLimit"] = kJsonDepthLimit;
@@ -37,15 +38,30 @@ bool Parse(const std::string &text, Json::Value &value, std::string &report) {
   }
 }
 
+Json::Value Parse(const std::string &what, const std::string &text) {
+  Json::Value value;
+  std::string report;
+  if (!ReadStrictly(text, value, report))
+    throw Failure(Failure::INVALID, what + " is not valid JSON: " + OneLine(report));
+  return value;
+}
+
 }  // namespace
 
 Json::Value ParseJsonObject(const std::string &what, const std::string &text) {
-  Json::Value value;
-  std::string report;
-  if (!Parse(text, value, report))
-    throw Failure(Failure::INVALID, what + " is not valid JSON: " + OneLine(report));
+  Json::Value value = Parse(what, text);
   if (!value.isObject()) throw Failure(Failure::INVALID, what + " must be a JSON object");
   return value;
+}
+
+std::vector<std::string> ParseJsonTexts(const std::string &what, const std::string &text) {
+  const Json::Value value = Parse(what, text);
+  const auto is_text = [](const Json::Value &item) { return item.isString(); };
+  if (!value.isArray() || !std::all_of(value.begin(), value.end(), is_text))
+    throw Failure(Failure::INVALID, what + " must be a JSON array of texts");
+  std::vector<std::string> texts;
+  for (const Json::Value &item : value) texts.push_back(item.asString());
+  return texts;
 }
 
 std::string JsonLine(const Json::Value &value) {

@@ -4,6 +4,7 @@
 #include <json/value.h>
 
 #include <string>
+#include <vector>
 
 namespace operations {
 
@@ -16,6 +17,10 @@ constexpr int kJsonDepthLimit = 500;
 /// @param what names the document in the failure's message.
 /// @throws Failure INVALID.
 Json::Value ParseJsonObject(const std::string &what, const std::string &text);
+
+/// Parses a JSON array of texts, as strictly.
+/// @throws Failure INVALID.
+std::vector<std::string> ParseJsonTexts(const std::string &what, const std::string &text);
 
 /// A document as one line of text.
 std::string JsonLine(const Json::Value &value);

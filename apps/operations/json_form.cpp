@@ -113,6 +113,29 @@ Json::Value ToJson(const LinkList &list, const Page &page) {
   return json;
 }
 
+Json::Value DeletedLinkToJson(const std::string &hash, int grants) {
+  Json::Value json(Json::objectValue);
+  json[SZK_HASH] = hash;
+  json["tokens"] = grants;
+  return json;
+}
+
+Json::Value ToJson(const LinkUrl &link) {
+  Json::Value json(Json::objectValue);
+  json[SZK_HASH] = link.hash;
+  json["url"] = link.url;
+  json["type"] = link.type;
+  return json;
+}
+
+Json::Value ToJson(const Verdict &verdict) {
+  Json::Value json(Json::objectValue);
+  json["let_in"] = verdict.let_in;
+  json["reason"] = verdict.reason;
+  json["sentence"] = verdict.sentence;
+  return json;
+}
+
 Json::Value ToJson(const SessionList &list, const Page &page) {
   Json::Value json = PageJson(list.total, page);
   json["lapsed"] = list.lapsed;
@@ -194,6 +217,14 @@ const char *RedirectTypeName(Entry::RedirectType type) {
       break;
   }
   return SZK_REDIRECT_REDIRECT_NONE;
+}
+
+std::optional<Entry::RedirectType> RedirectTypeFromName(const std::string &name) {
+  for (const Entry::RedirectType type :
+       {Entry::REDIRECT_NONE, Entry::REDIRECT_URLPARAM, Entry::REDIRECT_ALWAYS}) {
+    if (name == RedirectTypeName(type)) return type;
+  }
+  return std::nullopt;
 }
 
 std::string ShortIdentifier(const Session &session) {

@@ -3,10 +3,15 @@
 
 #include <json/value.h>
 
+#include <optional>
+#include <string>
+
 #include "operations/blocks.h"
+#include "operations/link_url.h"
 #include "operations/links.h"
 #include "operations/maintenance.h"
 #include "operations/sessions.h"
+#include "operations/verdict.h"
 
 /// The JSON forms of what the operations give, for machines. Times are whole seconds since the
 /// Unix epoch, 0 when not set. Nothing secret is in them: no digest, no salt, and of a session's
@@ -16,6 +21,10 @@ namespace operations {
 
 Json::Value ToJson(const Entry &link);
 Json::Value ToJson(const LinkList &list, const Page &page);
+/// A link that is gone with so many grants.
+Json::Value DeletedLinkToJson(const std::string &hash, int grants);
+Json::Value ToJson(const LinkUrl &link);
+Json::Value ToJson(const Verdict &verdict);
 Json::Value ToJson(const SessionList &list, const Page &page);
 Json::Value ToJson(const GrantList &list, const Page &page);
 Json::Value ToJson(const std::vector<Block> &blocks);
@@ -26,6 +35,9 @@ Json::Value ToJson(const CheckReport &report);
 /// "none", "password" or "user"; "none", "url_param" or "always".
 const char *ProtectTypeName(Entry::ProtectType type);
 const char *RedirectTypeName(Entry::RedirectType type);
+
+/// The kind of a name; nothing for other texts.
+std::optional<Entry::RedirectType> RedirectTypeFromName(const std::string &name);
 
 /// The first four characters of a session's identifier and an ellipsis: enough to recognise it.
 std::string ShortIdentifier(const Session &session);

@@ -30,28 +30,6 @@ void RefuseIllegal(const Entry &link) {
   throw Failure(Failure::REFUSED, "the link is not fit to be stored; the system log tells why");
 }
 
-const char *OrderColumn(LinkOrder order) {
-  switch (order) {
-    case BY_ID:
-      return SZK_ID_;
-    case BY_HASH:
-      return SZK_HASH;
-    case BY_PROJECT:
-      return SZK_PROJECT_NAME;
-    case BY_OWNER:
-      return SZK_OWNER_UID;
-    case BY_START:
-      return SZK_START_AT;
-    case BY_EXPIRY:
-      return SZK_EXPIRE_AT;
-    case BY_USES_ALLOWED:
-      return SZK_EXPIRE_TIMES;
-    case BY_USE_COUNT:
-      return SZK_USE_COUNT;
-  }
-  return SZK_ID_;
-}
-
 void Filter(const LinkQuery &query, long now, Condition &condition) {
   if (query.project) condition.Where(SZK_PROJECT_NAME, *query.project);
   if (query.owner_uid) condition.Where("owner_uid = " + std::to_string(*query.owner_uid));
@@ -59,7 +37,7 @@ void Filter(const LinkQuery &query, long now, Condition &condition) {
 }
 
 void OrderAndPage(const LinkQuery &query, Condition &condition) {
-  condition.OrderBy(OrderColumn(query.order), query.descending);
+  condition.OrderBy(LinkOrderColumn(query.order), query.descending);
   // Equal rows keep their order from page to page.
   if (query.order != BY_ID) condition.OrderBy(SZK_ID_, query.descending);
   condition.Limit(query.page.offset, query.page.limit);
@@ -118,6 +96,28 @@ int DeleteLink(BaseDB &db, const std::string &hash) {
   const int grants = RemovedRows(db);
   transaction.Commit();
   return grants;
+}
+
+const char *LinkOrderColumn(LinkOrder order) {
+  switch (order) {
+    case BY_ID:
+      return SZK_ID_;
+    case BY_HASH:
+      return SZK_HASH;
+    case BY_PROJECT:
+      return SZK_PROJECT_NAME;
+    case BY_OWNER:
+      return SZK_OWNER_UID;
+    case BY_START:
+      return SZK_START_AT;
+    case BY_EXPIRY:
+      return SZK_EXPIRE_AT;
+    case BY_USES_ALLOWED:
+      return SZK_EXPIRE_TIMES;
+    case BY_USE_COUNT:
+      return SZK_USE_COUNT;
+  }
+  return SZK_ID_;
 }
 
 LinkList ListLinks(BaseDB &db, const LinkQuery &query) {

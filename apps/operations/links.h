@@ -1,6 +1,7 @@
 #ifndef OPERATIONS_LINKS_H
 #define OPERATIONS_LINKS_H
 
+#include <array>
 #include <optional>
 #include <string>
 #include <vector>
@@ -43,6 +44,12 @@ enum LinkOrder {
   BY_USES_ALLOWED,
   BY_USE_COUNT
 };
+
+constexpr std::array<LinkOrder, 8> kLinkOrders = {
+    BY_ID, BY_HASH, BY_PROJECT, BY_OWNER, BY_START, BY_EXPIRY, BY_USES_ALLOWED, BY_USE_COUNT};
+
+/// The name of the column, which is that of the link's JSON form, too.
+const char *LinkOrderColumn(LinkOrder order);
 
 /// Which links, in which order.
 struct LinkQuery {

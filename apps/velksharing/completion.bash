@@ -13,7 +13,7 @@ _velksharing() {
   local -a command=("${COMP_WORDS[0]}")
   COMPREPLY=()
   case $previous in
-    --password-file | --session-file | --path | backup)
+    --password-file | --session-file | --path | --qr-svg | backup)
       mapfile -t COMPREPLY < <(compgen -f -- "$word")
       return
       ;;

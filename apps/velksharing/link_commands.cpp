@@ -8,11 +8,14 @@
 #include "operations/address.h"
 #include "operations/json_document.h"
 #include "operations/json_form.h"
+#include "operations/link_url.h"
 #include "operations/links.h"
 #include "operations/moment.h"
 #include "operations/permissions.h"
+#include "operations/unfinished_file.h"
 #include "operations/verdict.h"
 #include "output.h"
+#include "qr_code.h"
 #include "session_option.h"
 #include "text_option.h"
 
@@ -223,10 +226,8 @@ ExitStatus Delete(const std::vector<std::string> &hashes, const Request &request
   SharingDB &db = SharingDatabase();
   return ForEach(hashes, request, [&](const std::string &hash) {
     const int grants = DeleteLink(db, hash);
-    Json::Value json(Json::objectValue);
-    json["hash"] = hash;
-    json["tokens"] = grants;
-    return Done{json, hash + " deleted with " + Counted(grants, "grant")};
+    return Done{DeletedLinkToJson(hash, grants),
+                hash + " deleted with " + Counted(grants, "grant")};
   });
 }
 
@@ -267,6 +268,39 @@ void AddPurge(CLI::App &group, Request &request) {
       ->excludes(project);
 }
 
+struct UrlOptions {
+  std::string hash;
+  bool qr = false;
+  TextOption qr_svg;
+};
+
+ExitStatus Url(const UrlOptions &options, const Request &request) {
+  const LinkUrl link = UrlOfLink(SharingDatabase(), options.hash);
+  if (options.qr_svg.given()) {
+    UnfinishedFile file(*options.qr_svg.value());
+    file.Write(QrCodeSvg(QrCode(link.url)));
+    file.Publish();
+  }
+  if (request.json) {
+    PrintJson(ToJson(link));
+    return EXIT_DONE;
+  }
+  PrintLine(link.url);
+  if (options.qr) PrintQrCode(QrCode(link.url));
+  return EXIT_DONE;
+}
+
+void AddUrl(CLI::App &group, Request &request) {
+  auto options = std::make_shared<UrlOptions>();
+  CLI::App *command =
+      AddCommand(group, request, "url", "Print the URL under which visitors reach a link",
+                 "link url aB3xK9pQ2 --qr", [options, &request] { return Url(*options, request); });
+  command->add_option("HASH", options->hash, "The link")->required();
+  command->add_flag("--qr", options->qr, "Also as a QR code, to be read from the screen")
+      ->excludes(command->get_option("--json"));
+  options->qr_svg.AddTo(*command, "--qr-svg", "FILE", "Write a QR code to a new SVG file");
+}
+
 struct WhyOptions {
   std::string hash;
   TextOption address;
@@ -279,15 +313,10 @@ ExitStatus Why(const WhyOptions &options, const Request &request) {
   const std::unique_ptr<BaseDB> db = OpenForReading();
   const Verdict verdict = session ? JudgeSession(*db, options.hash, *session, address)
                                   : JudgeLogin(*db, options.hash, address);
-  if (request.json) {
-    Json::Value json(Json::objectValue);
-    json["let_in"] = verdict.let_in;
-    json["reason"] = verdict.reason;
-    json["sentence"] = verdict.sentence;
-    PrintJson(json);
-  } else {
+  if (request.json)
+    PrintJson(ToJson(verdict));
+  else
     PrintLine(verdict.sentence);
-  }
   return verdict.let_in ? EXIT_DONE : EXIT_REFUSED;
 }
 
@@ -318,6 +347,7 @@ void AddLinkCommands(CLI::App &program, Request &request) {
       [](const auto &hashes, const Request &asked) { return Enable(hashes, false, asked); });
   AddForHashes(*group, request, "delete", "Delete links and the grants on them", Delete);
   AddPurge(*group, request);
+  AddUrl(*group, request);
   AddWhy(*group, request);
 }
 

@@ -5,6 +5,7 @@
 #include "operations/accounts.h"
 #include "operations/failure.h"
 #include "operations/json_document.h"
+#include "operations/json_form.h"
 #include "operations/moment.h"
 #include "time_input.h"
 
@@ -13,12 +14,6 @@ namespace {
 
 using operations::Failure;
 using operations::LinkChange;
-using VELK::sharing::record::Entry;
-
-Entry::RedirectType ParseRedirect(const std::string &name) {
-  if (name == "none") return Entry::REDIRECT_NONE;
-  return name == "always" ? Entry::REDIRECT_ALWAYS : Entry::REDIRECT_URLPARAM;
-}
 
 int ParseUses(const std::string &text) {
   if (text == "unlimited") return 0;
@@ -149,7 +144,8 @@ void LinkOptions::ReadLimits(LinkChange &change) const {
 }
 
 void LinkOptions::ReadRedirect(LinkChange &change) const {
-  if (redirect_.given()) change.redirect_type = ParseRedirect(*redirect_.value());
+  if (redirect_.given())
+    change.redirect_type = operations::RedirectTypeFromName(*redirect_.value());
   change.redirect_uri = redirect_uri_.value();
 }
 

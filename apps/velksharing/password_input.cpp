@@ -6,14 +6,15 @@
 #include <unistd.h>
 
 #include <array>
-#include <cerrno>
 
 #include "operations/failure.h"
+#include "operations/secret_input.h"
 
 namespace command_line {
 namespace {
 
 using operations::Failure;
+using operations::ReadSecretLine;
 using operations::SystemFailure;
 
 constexpr int kQuestions = 3;
@@ -86,52 +87,13 @@ class SilentTerminal {
   struct termios before_ = {};
 };
 
-void Append(Secret &line, char byte) {
-  if (line.Append(byte)) return;
-  throw Failure(Failure::INVALID,
-                "the secret is longer than " + std::to_string(Secret::kCapacity) + " bytes");
-}
-
-/// @return false at the end of the file.
-bool ReadByte(int file, char &byte) {
-  for (;;) {
-    const ssize_t count = read(file, &byte, 1);
-    if (count >= 0) return count == 1;
-    if (errno != EINTR || caught_signal != 0) throw SystemFailure("the secret could not be read");
-  }
-}
-
-/// Byte by byte, so that nothing of the secret stays in a buffer and nothing behind it is taken.
-/// @return false when the file ended before its first byte.
-bool ReadLine(int file, Secret &line) {
-  bool any = false;
-  bool held_return = false;  // A "\r" that belongs to the line's end if "\n" comes next.
-  char byte = 0;
-  while (ReadByte(file, byte)) {
-    any = true;
-    if (byte == '\n') return true;
-    if (held_return) Append(line, '\r');
-    held_return = byte == '\r';
-    if (!held_return) Append(line, byte);
-  }
-  if (held_return) Append(line, '\r');
-  return any;
-}
-
-Secret ReadFirstLine(int file) {
-  Secret line;
-  if (!ReadLine(file, line))
-    throw Failure(Failure::INVALID, "there is no line to read the secret from");
-  return line;
-}
-
 }  // namespace
 
 Secret AskSecret(const std::string &question) {
   const SignalPostponement postponed;
   const SilentTerminal terminal;
   terminal.Say(question + ": ");
-  return ReadFirstLine(terminal.file());
+  return ReadSecretLine(terminal.file(), [] { return caught_signal != 0; });
 }
 
 Secret AskNewSecret(const std::string &question) {
@@ -143,14 +105,14 @@ Secret AskNewSecret(const std::string &question) {
 }
 
 Secret ReadSecretFromInput() {
-  return ReadFirstLine(STDIN_FILENO);
+  return ReadSecretLine(STDIN_FILENO);
 }
 
 Secret ReadSecretFromFile(const std::string &path) {
   const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NOCTTY);
   if (file < 0) throw SystemFailure(path);
   try {
-    Secret line = ReadFirstLine(file);
+    Secret line = ReadSecretLine(file);
     close(file);
     return line;
   } catch (...) {

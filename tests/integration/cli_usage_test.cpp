@@ -25,6 +25,7 @@ const std::vector<std::vector<std::string>> kCommands = {
     {"link", "disable"},
     {"link", "delete"},
     {"link", "purge"},
+    {"link", "url"},
     {"link", "why"},
     {"session", "list"},
     {"session", "delete"},

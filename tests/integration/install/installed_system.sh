@@ -190,6 +190,16 @@ check "the session of a visit" 32 "${#session}"
 check "a later visit in that session" "1" "$(
   velksharing visit check "$hash" --session-file <(echo "$session") | cut -d' ' -f1)"
 
+echo "== The platform's programs"
+install -m 644 "$programs/share/doc/velksharing/examples/sharing-url.conf" /usr/velk/etc/
+echo "external_host = share.example.org" >>/usr/velk/etc/sharing-url.conf
+check "the URL of a link" "http://share.example.org/sharing/$hash" "$(velksharing link url "$hash")"
+ask() { "$@" /usr/velk/bin/velkwebapi --exec api=VELK.Sharing.Link version=1 method=why hash="$hash"; }
+check "the web API asked by root" yes "$(ask env | grep -q '"success":true' && echo yes)"
+check "and by the system account" yes "$(
+  ask "${as_system_account[@]}" | grep -q '"success":true' && echo yes)"
+check "and by a stranger" yes "$(ask "${as_nobody[@]}" | grep -q '"code":401' && echo yes)"
+
 echo "== No secret in the log"
 for secret in ann-secret member-secret locked-secret expired-secret "$session"; do
   check "not in the log" no "$(grep -qF -- "$secret" "$log" && echo yes || echo no)"

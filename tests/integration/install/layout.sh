@@ -46,7 +46,9 @@ expect_file "$prefix"/lib/libvelksharing.so{,.6} "$prefix"/lib/libvelk{cgi,core,
 expect_file "$prefix"/lib/pkgconfig/velksharing.pc \
   "$prefix"/lib/cmake/velksharing/velksharing-{config,config-version,targets}.cmake
 expect_file "$prefix/sbin/velksharing" "$prefix/share/man/man8/velksharing.8"
-expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,pam/velk}
+expect_file "$stage"/usr/velk/bin/{velksharingurl,velkwebapi} \
+  "$prefix"/share/man/man8/{velksharingurl,velkwebapi}.8 "$prefix/share/doc/velksharing/webapi.md"
+expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url.conf,pam/velk}
 expect_folder "$stage/usr/velk/etc/private" 750
 expect_folder "$stage/usr/velk/etc/private/session" 750
 
@@ -59,7 +61,7 @@ traces=$(grep -rIlF "$build" "$stage" || true)
 [ -z "$traces" ] || complain "knows the folder that it was built in: $traces"
 
 # Every program and library runs from where the tree lies.
-for file in "$prefix"/lib/libvelk*.so "$prefix"/sbin/*; do
+for file in "$prefix"/lib/libvelk*.so "$prefix"/sbin/* "$stage"/usr/velk/bin/*; do
   needed=$(ldd "$file")
   lost=$(grep -E 'not found|libvelk' <<<"$needed" | grep -vF "=> $(realpath "$stage")/" || true)
   [ -z "$lost" ] || complain "$file does not find its libraries in the tree: $lost"
