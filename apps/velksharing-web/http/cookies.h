@@ -1,0 +1,32 @@
+#ifndef VELKSHARING_WEB_HTTP_COOKIES_H
+#define VELKSHARING_WEB_HTTP_COOKIES_H
+
+#include <string>
+#include <string_view>
+
+#include "http/request.h"
+
+namespace web {
+
+/// The value of a cookie that a request brings, without quotes around it; "" when there is none.
+/// The first of equal names counts: browsers send that of the longest path first.
+std::string_view FindCookie(const Request &request, std::string_view name);
+
+/// A cookie for the browser. It is always HttpOnly, and ends with the browser's session.
+struct Cookie {
+  std::string name;
+  std::string value;
+  std::string path;
+  bool is_secure = false;     ///< Only by https.
+  bool is_strict = false;     ///< SameSite=Strict instead of Lax.
+  bool is_withdrawn = false;  ///< The browser shall forget it; the value plays no part.
+};
+
+/// The value of Set-Cookie.
+/// @return "" when name, value or path hold what a cookie cannot: control characters, blanks,
+///         quotes, commas, semicolons, backslashes, bytes beyond ASCII; "=" in the name.
+std::string SetCookieText(const Cookie &cookie);
+
+}  // namespace web
+
+#endif
