@@ -1,0 +1,16 @@
+# Writes a C++ source that holds files of this folder:
+# cmake -DOUTPUT=source.cpp -DFILES=a,b -P embed.cmake
+string(REPLACE "," ";" FILES "${FILES}")
+set(source "#include \"pages/embedded_files.h\"\n\nnamespace web {\n\n")
+string(APPEND source "const std::vector<EmbeddedFile> &EmbeddedFiles() {\n")
+string(APPEND source "  static const std::vector<EmbeddedFile> files = {\n")
+foreach(name IN LISTS FILES)
+  file(READ "${CMAKE_CURRENT_LIST_DIR}/${name}" content)
+  string(FIND "${content}" ")embedded\"" end)
+  if(NOT end EQUAL -1)
+    message(FATAL_ERROR "${name} holds the mark that ends an embedded file")
+  endif()
+  string(APPEND source "      {\"${name}\", R\"embedded(${content})embedded\"},\n")
+endforeach()
+string(APPEND source "  };\n  return files;\n}\n\n}  // namespace web\n")
+file(WRITE "${OUTPUT}" "${source}")

@@ -1,0 +1,108 @@
+#include "pages/language_choice.h"
+
+#include <strings.h>
+
+#include <algorithm>
+#include <optional>
+
+namespace web {
+namespace {
+
+/// One wish of the field: a tag or "*", and how much it is wanted, 0 to 1000; 0 is not at all.
+struct Wish {
+  std::string_view tag;
+  int quality = 1000;
+};
+
+std::string_view Trimmed(std::string_view text) {
+  constexpr std::string_view kBlanks = " \t";
+  const size_t begin = text.find_first_not_of(kBlanks);
+  if (begin == std::string_view::npos) return {};
+  return text.substr(begin, text.find_last_not_of(kBlanks) - begin + 1);
+}
+
+/// Takes what stands before the next `separator` off `text`, and the separator too.
+std::string_view TakePart(std::string_view &text, char separator) {
+  const size_t end = std::min(text.find(separator), text.size());
+  const std::string_view part = Trimmed(text.substr(0, end));
+  text.remove_prefix(std::min(end + 1, text.size()));
+  return part;
+}
+
+/// "0.85" as 850. Nothing for what is no number from 0 to 1 with at most three decimals.
+std::optional<int> Quality(std::string_view text) {
+  if (text.empty() || text.size() > 5 || (text[0] != '0' && text[0] != '1')) return {};
+  if (text.size() > 1 && text[1] != '.') return {};
+  int quality = (text[0] - '0') * 1000;
+  int worth = 100;
+  for (const char digit : text.substr(std::min<size_t>(2, text.size()))) {
+    if (digit < '0' || digit > '9') return {};
+    quality += (digit - '0') * worth;
+    worth /= 10;
+  }
+  if (quality > 1000) return {};
+  return quality;
+}
+
+std::optional<Wish> ReadWish(std::string_view text) {
+  Wish wish{TakePart(text, ';')};
+  if (wish.tag.empty()) return {};
+  while (!text.empty()) {
+    std::string_view parameter = TakePart(text, ';');
+    const std::string_view name = TakePart(parameter, '=');
+    if (name != "q" && name != "Q") continue;
+    const std::optional<int> quality = Quality(Trimmed(parameter));
+    if (!quality) return {};
+    wish.quality = *quality;
+  }
+  return wish;
+}
+
+std::vector<Wish> ReadWishes(std::string_view field) {
+  std::vector<Wish> wishes;
+  while (!field.empty()) {
+    if (const std::optional<Wish> wish = ReadWish(TakePart(field, ','))) wishes.push_back(*wish);
+  }
+  return wishes;
+}
+
+bool AreAlike(std::string_view left, std::string_view right) {
+  return left.size() == right.size() && strncasecmp(left.data(), right.data(), left.size()) == 0;
+}
+
+/// Whether `tag` is `start` or a kind of it: "de-CH" of "de".
+bool IsKindOf(std::string_view tag, std::string_view start) {
+  return AreAlike(tag.substr(0, start.size()), start) &&
+         (tag.size() == start.size() || tag[start.size()] == '-');
+}
+
+bool Fits(const Wish &wish, std::string_view language) {
+  return wish.tag == "*" || IsKindOf(wish.tag, language) || IsKindOf(language, wish.tag);
+}
+
+bool IsRefused(const std::vector<Wish> &wishes, std::string_view language) {
+  return std::any_of(wishes.begin(), wishes.end(), [language](const Wish &wish) {
+    return wish.quality == 0 && AreAlike(wish.tag, language);
+  });
+}
+
+}  // namespace
+
+const std::string &ChooseAmong(const std::vector<std::string> &offered,
+                               std::string_view accept_language) {
+  std::vector<Wish> wishes = ReadWishes(accept_language);
+  std::stable_sort(wishes.begin(), wishes.end(), [](const Wish &left, const Wish &right) {
+    return left.quality > right.quality;
+  });
+  for (const Wish &wish : wishes) {
+    if (wish.quality == 0) break;
+    const auto found =
+        std::find_if(offered.begin(), offered.end(), [&](const std::string &language) {
+          return Fits(wish, language) && !IsRefused(wishes, language);
+        });
+    if (found != offered.end()) return *found;
+  }
+  return offered.front();
+}
+
+}  // namespace web
