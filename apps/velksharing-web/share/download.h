@@ -15,7 +15,7 @@ enum class Purpose {
 
 /// Answers GET or HEAD for a file: 200, 206, 304, 412 or 416, with ETag, Last-Modified,
 /// Accept-Ranges, Content-Type, Content-Disposition and Cache-Control. Several ranges at once get
-/// the whole file. The body is a FileBody, also for HEAD; that of 412 and 416 is "".
+/// the whole file. The body is a FileBody, also for HEAD; that of 304, 412 and 416 is "".
 ///
 /// The answer brings its own Content-Security-Policy, made for a file that is not a page of ours;
 /// whoever adds such headers to every answer leaves this one alone.

@@ -42,7 +42,7 @@ struct Listing {
 /// Reads a folder: folders first, then files, each by `order`. Names are compared without regard to
 /// case and numbers in them by value ("page 9" before "page 10"); equal sizes and dates go by name.
 /// Left out is what SharedTree does not give; a file that the owner cannot read is listed.
-/// @param folder from `tree`. Null pointers do not exist here; a file gives nothing.
+/// @param folder from `tree`; a file gives nothing.
 /// @return nothing when the folder cannot be read.
 std::optional<Listing> ReadListing(const SharedTree &tree, const Item &folder, Order order);
 

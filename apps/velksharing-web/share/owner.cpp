@@ -1,0 +1,51 @@
+#include "share/owner.h"
+
+#include <grp.h>
+#include <pwd.h>
+
+#include <cerrno>
+#include <string>
+
+namespace web::share {
+namespace {
+
+constexpr size_t kSmallestBuffer = 1024;
+constexpr size_t kLargestBuffer = 1024 * 1024;
+constexpr int kUsualGroups = 32;
+
+std::optional<Owner> FindAccount(uid_t uid, std::string &login_name) {
+  std::vector<char> buffer(kSmallestBuffer);
+  passwd account = {};
+  passwd *found = nullptr;
+  int error = 0;
+  while ((error = getpwuid_r(uid, &account, buffer.data(), buffer.size(), &found)) == ERANGE &&
+         buffer.size() < kLargestBuffer) {
+    buffer.resize(buffer.size() * 2);
+  }
+  if (found == nullptr) return std::nullopt;
+  login_name = account.pw_name;
+  return Owner{account.pw_uid, account.pw_gid, {}};
+}
+
+std::vector<gid_t> FindGroups(const std::string &login_name, gid_t gid) {
+  int count = kUsualGroups;
+  std::vector<gid_t> groups(kUsualGroups);
+  // The account may join a group between two calls.
+  while (getgrouplist(login_name.c_str(), gid, groups.data(), &count) < 0) {
+    groups.resize(static_cast<size_t>(count));
+  }
+  groups.resize(static_cast<size_t>(count));
+  return groups;
+}
+
+}  // namespace
+
+std::optional<Owner> FindOwner(uid_t uid) {
+  std::string login_name;
+  std::optional<Owner> owner = FindAccount(uid, login_name);
+  if (!owner) return std::nullopt;
+  owner->groups = FindGroups(login_name, owner->gid);
+  return owner;
+}
+
+}  // namespace web::share

@@ -1,0 +1,141 @@
+#include "share/owner_scope.h"
+
+#include <linux/capability.h>
+#include <sys/fsuid.h>
+#include <sys/prctl.h>
+#include <sys/syscall.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+
+namespace web::share {
+namespace {
+
+constexpr uid_t kRoot = 0;
+// No account has this id: the kernel answers with the current one and changes nothing.
+constexpr uid_t kAskUid = static_cast<uid_t>(-1);
+constexpr gid_t kAskGid = static_cast<gid_t>(-1);
+
+constexpr uint64_t Bit(int capability) {
+  return uint64_t{1} << capability;
+}
+
+constexpr uint64_t kSwitching = Bit(CAP_SETUID) | Bit(CAP_SETGID);
+constexpr uint64_t kPastPermissions = Bit(CAP_DAC_OVERRIDE) | Bit(CAP_DAC_READ_SEARCH) |
+                                      Bit(CAP_FOWNER) | Bit(CAP_CHOWN) | Bit(CAP_MAC_OVERRIDE);
+
+struct CapabilitySets {
+  __user_cap_header_struct header = {_LINUX_CAPABILITY_VERSION_3, 0};
+  __user_cap_data_struct data[_LINUX_CAPABILITY_U32S_3] = {};
+};
+
+bool Get(CapabilitySets &sets) {
+  return syscall(SYS_capget, &sets.header, sets.data) == 0;
+}
+
+uint64_t EffectiveCapabilities() {
+  CapabilitySets sets;
+  if (!Get(sets)) return 0;
+  return uint64_t{sets.data[1].effective} << 32 | sets.data[0].effective;
+}
+
+bool SetEffectiveCapabilities(uint64_t capabilities) {
+  CapabilitySets sets;
+  if (!Get(sets)) return false;
+  sets.data[0].effective = static_cast<uint32_t>(capabilities);
+  sets.data[1].effective = static_cast<uint32_t>(capabilities >> 32);
+  return syscall(SYS_capset, &sets.header, sets.data) == 0;
+}
+
+// The C library's setgroups() changes every thread.
+bool SetGroups(const std::vector<gid_t> &groups) {
+#ifdef SYS_setgroups32
+  constexpr long kCall = SYS_setgroups32;
+#else
+  constexpr long kCall = SYS_setgroups;
+#endif
+  return syscall(kCall, groups.size(), groups.data()) == 0;
+}
+
+std::vector<gid_t> Groups() {
+  const int count = getgroups(0, nullptr);
+  std::vector<gid_t> groups(count > 0 ? static_cast<size_t>(count) : 0);
+  if (!groups.empty() && getgroups(count, groups.data()) != count) groups.clear();
+  return groups;
+}
+
+uid_t FileUid() {
+  return static_cast<uid_t>(setfsuid(kAskUid));
+}
+gid_t FileGid() {
+  return static_cast<gid_t>(setfsgid(kAskGid));
+}
+
+// These calls do not say whether they did it.
+bool SetFileUid(uid_t uid) {
+  setfsuid(uid);
+  return FileUid() == uid;
+}
+bool SetFileGid(gid_t gid) {
+  setfsgid(gid);
+  return FileGid() == gid;
+}
+
+// The capabilities come last: a user id that changes from or to root's takes some away or brings
+// them back, and a process that is not root keeps what it should not have.
+bool SetFileRights(const FileRights &rights) {
+  return SetGroups(rights.groups) && SetFileGid(rights.gid) && SetFileUid(rights.uid) &&
+         SetEffectiveCapabilities(rights.capabilities);
+}
+
+FileRights RightsOf(const Owner &owner, const FileRights &current) {
+  return {owner.uid, owner.gid, owner.groups, current.capabilities & ~kPastPermissions};
+}
+
+}  // namespace
+
+FileRights CurrentFileRights() {
+  return {FileUid(), FileGid(), Groups(), EffectiveCapabilities()};
+}
+
+bool MaySwitchFileRights() {
+  return (EffectiveCapabilities() & kSwitching) == kSwitching;
+}
+
+OwnerScope::OwnerScope(const Owner &owner) {
+  if (!MaySwitchFileRights()) {
+    is_entered_ = true;
+    return;
+  }
+  if (owner.uid == kRoot) {
+    syslog(LOG_NOTICE, "nothing is opened as root: a link of root is not served");
+    return;
+  }
+  saved_ = CurrentFileRights();
+  prctl(PR_GET_PDEATHSIG, &saved_death_signal_);
+  is_switched_ = true;
+  is_entered_ = SetFileRights(RightsOf(owner, saved_));
+  if (is_entered_) return;
+  syslog(LOG_ERR, "cannot take on the file rights of user %u", owner.uid);
+  Leave();
+  is_switched_ = false;
+}
+
+OwnerScope::~OwnerScope() {
+  if (!is_switched_) return;
+  const int callers_errno = errno;
+  Leave();
+  errno = callers_errno;
+}
+
+void OwnerScope::Leave() const {
+  if (!SetFileRights(saved_)) {
+    syslog(LOG_CRIT, "cannot get back from another user's file rights; this process ends");
+    abort();
+  }
+  if (saved_death_signal_ != 0) prctl(PR_SET_PDEATHSIG, saved_death_signal_);
+}
+
+}  // namespace web::share
