@@ -15,9 +15,10 @@ class PagesPrivate;
 /// What a site decides about its pages.
 struct PagesSettings {
   std::string base_path =
-      "/sharing";           ///< Where the links lie; no slash at the end; "" for the root.
-  std::string site_folder;  ///< Folder of the site's own texts, colours and templates; "" for none.
-  std::string product_name;  ///< Stands at the head of each page; "" for the catalogue's word.
+      "/sharing";  ///< Where the links lie; no slash at the end; "" for the root.
+  std::string
+      site_folder{};  ///< Folder of the site's own texts, colours and templates; "" for none.
+  std::string product_name{};  ///< Stands at the head of each page; "" for the catalogue's word.
   // Names of the fields of the login forms.
   std::string password_field = "password";
   std::string account_field = "zed_username";
@@ -26,8 +27,8 @@ struct PagesSettings {
 
 /// A file that pages refer to: style sheet, icons, the site's logo.
 struct Asset {
-  std::string type;  ///< For Content-Type: "text/css; charset=utf-8".
-  std::string bytes;
+  std::string type{};  ///< For Content-Type: "text/css; charset=utf-8".
+  std::string bytes{};
 };
 
 /// Writes the visitors' pages: HTML without script, in the visitor's language.

@@ -17,20 +17,20 @@ namespace web {
 
 /// Who reads a page.
 struct Reader {
-  std::string language;  ///< What Pages::ChooseLanguage() gave.
+  std::string language{};  ///< What Pages::ChooseLanguage() gave.
   /// The token of every form that is posted, as hidden field `csrf`; letters, digits and `-_`.
-  std::string csrf;
+  std::string csrf{};
 };
 
 /// The link that a page belongs to.
 struct LinkView {
-  std::string hash;
-  std::string title;  ///< "" for none: the page then speaks of "shared files".
+  std::string hash{};
+  std::string title{};  ///< "" for none: the page then speaks of "shared files".
   /// Whether there is something to leave: shows the button that posts to base/HASH/logout.
   bool can_log_out = false;
   /// Where the link's owner wants visitors to go on; "" for none. An http(s) address, checked by
   /// the caller; anything else is left out.
-  std::string continue_to;
+  std::string continue_to{};
 };
 
 /// Why a visitor is asked again.
@@ -42,9 +42,9 @@ enum class LoginProblem {
 
 /// The page that a link's protection needs. Its form posts to base/HASH.
 struct LoginView {
-  LinkView link;
+  LinkView link{};
   LoginProblem problem = LoginProblem::kNone;
-  std::string account;  ///< Account page only: the name that was typed, shown again.
+  std::string account{};  ///< Account page only: the name that was typed, shown again.
 };
 
 /// What a file is, as far as icon and preview are concerned.
@@ -52,7 +52,7 @@ enum class FileKind { kFolder, kImage, kText, kAudio, kVideo, kPdf, kArchive, kO
 
 /// One line of a folder.
 struct FolderEntry {
-  std::string name;  ///< One component, not "" "." "..".
+  std::string name{};  ///< One component, not "" "." "..".
   FileKind kind = FileKind::kOther;
   uint64_t size = 0;  ///< In bytes; not shown for folders.
   time_t modified = 0;
@@ -63,10 +63,10 @@ enum class SortBy { kName, kSize, kDate };
 
 /// A folder. Its own address ends with a slash, but for the shared folder itself.
 struct FolderView {
-  LinkView link;
-  std::vector<std::string> path;     ///< Components below the shared folder; empty for itself.
-  std::vector<FolderEntry> entries;  ///< In the order to be shown: sorted by the caller.
-  SortBy sort = SortBy::kName;       ///< The order that they have, for the column heads.
+  LinkView link{};
+  std::vector<std::string> path{};     ///< Components below the shared folder; empty for itself.
+  std::vector<FolderEntry> entries{};  ///< In the order to be shown: sorted by the caller.
+  SortBy sort = SortBy::kName;         ///< The order that they have, for the column heads.
   bool is_descending = false;
   bool is_incomplete = false;  ///< Whether there were too many to show them all.
   bool can_download = true;    ///< false: no downloads, no selection, no ZIP.
@@ -74,25 +74,25 @@ struct FolderView {
 
 /// One file and, where a browser can show it, its content.
 struct FileView {
-  LinkView link;
+  LinkView link{};
   /// Components below the shared folder, the file's name last; empty when the link shares this
   /// very file.
-  std::vector<std::string> path;
-  std::string name;
+  std::vector<std::string> path{};
+  std::string name{};
   FileKind kind = FileKind::kOther;
-  std::string media_type;  ///< "image/png"; shown, and given to audio and video elements.
-  uint64_t size = 0;       ///< In bytes.
+  std::string media_type{};  ///< "image/png"; shown, and given to audio and video elements.
+  uint64_t size = 0;         ///< In bytes.
   time_t modified = 0;
   /// Whether `?view` gives the content inline. Without it only `text` is previewed.
   bool can_view = false;
   /// The beginning of a text file, of any encoding, at most Pages::kTextPreviewBytes; shown
   /// escaped, for files of any kind.
-  std::optional<std::string> text;
+  std::optional<std::string> text{};
   bool text_is_cut = false;  ///< Whether the file goes on behind `text`.
   bool can_download = true;
   std::string
       previous;  ///< Name of the file before and behind this one in the folder; "" for none.
-  std::string next;
+  std::string next{};
 };
 
 }  // namespace web
