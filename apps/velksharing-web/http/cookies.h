@@ -12,13 +12,13 @@ namespace web {
 /// The first of equal names counts: browsers send that of the longest path first.
 std::string_view FindCookie(const Request &request, std::string_view name);
 
-/// A cookie for the browser. It is always HttpOnly, and ends with the browser's session.
+/// A cookie for the browser. It is always HttpOnly and SameSite=Lax, and ends with the browser's
+/// session.
 struct Cookie {
   std::string name;
   std::string value;
   std::string path;
   bool is_secure = false;     ///< Only by https.
-  bool is_strict = false;     ///< SameSite=Strict instead of Lax.
   bool is_withdrawn = false;  ///< The browser shall forget it; the value plays no part.
 };
 

@@ -1,0 +1,43 @@
+#ifndef VELKSHARING_WEB_SITE_LINK_H
+#define VELKSHARING_WEB_SITE_LINK_H
+
+#include <velksharing/record.h>
+
+#include <optional>
+#include <string>
+
+#include "share/shared_tree.h"
+
+namespace web {
+
+/// A link that has something for visitors, with what it has.
+struct Link {
+  VELK::sharing::record::Entry entry;
+  /// Where visitors are sent as soon as they are in; "" for nowhere.
+  std::string target;
+  /// Where the page offers to go on; "" for nowhere.
+  std::string continue_to;
+  /// Open unless `target` is set.
+  std::optional<share::SharedTree> tree;
+
+  bool HasUseLimit() const { return entry.get_expire_times() > 0; }
+  bool IsOpen() const;
+  /// Whether files may be taken along, and not only looked at.
+  bool CanDownload() const;
+};
+
+/// Looks a link up by its hash.
+/// @return nothing for a link that does not exist, cannot be read back, or has nothing to show:
+///         its owner is gone, or cannot read what it shares. Whether it is enabled, has started
+///         and the like is not looked at.
+std::optional<Link> FindLink(const std::string &hash);
+
+/// Whether a link lets new visitors in now.
+bool AdmitsVisitors(const Link &link);
+
+/// Whether the database answers at all.
+bool DatabaseAnswers();
+
+}  // namespace web
+
+#endif
