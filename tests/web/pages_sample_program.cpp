@@ -1,6 +1,6 @@
 // Writes one of each page into a folder, as sample-NAME.html, and the files they refer to into the
-// folder "-" below it: for the browser tests, which look at pages that a server shows only when
-// something is wrong.
+// folder "-" below it; the file "policy" has their Content-Security-Policy. For the browser tests,
+// which look at pages, too, that a server shows only when something is wrong.
 
 #include <filesystem>
 #include <iostream>
@@ -94,6 +94,7 @@ class Writer {
     Write("message-404", pages_.Message(reader_, 404));
     Write("message-429", pages_.Message(reader_, 429, 1200));
     Write("message-503", pages_.Message(reader_, 503, 30));
+    velk_test::WriteFile(folder_ + "/policy", std::string(web::Pages::kContentSecurityPolicy));
   }
 
  private:

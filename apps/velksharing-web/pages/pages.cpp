@@ -167,7 +167,7 @@ std::string Pages::Continue(const Reader &reader, const LinkView &link,
   const std::string host = ShownName(HostOf(address));
   Data data;
   data.set("target", address.empty() ? private_->addresses.Link(link.hash) : address);
-  data.set("hint", texts.Text("continue_hint", {{"host", host}}));
+  SetOrFalse(data, "hint", host.empty() ? "" : texts.Text("continue_hint", {{"host", host}}));
   return private_->Document(reader, {"continue", texts.Text("continue_window"), link, address},
                             data);
 }

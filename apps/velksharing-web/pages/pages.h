@@ -94,7 +94,7 @@ class Pages {
   /// Asks for one click: an open link that is not entered by looking at it.
   std::string Open(const Reader &reader, const LoginView &view) const;
   /// Says that the visitor is in, and goes on to `target` (http or https, checked by the caller)
-  /// by itself.
+  /// by itself. A target that is none leads back to the link.
   std::string Continue(const Reader &reader, const LinkView &link, const std::string &target) const;
 
   std::string Folder(const Reader &reader, const FolderView &view) const;
