@@ -1,0 +1,216 @@
+#include "server/fastcgi_server.h"
+
+#include <fcgiapp.h>
+#include <poll.h>
+#include <sys/eventfd.h>
+#include <sys/socket.h>
+
+#include <atomic>
+#include <cerrno>
+#include <mutex>
+#include <stdexcept>
+#include <string_view>
+#include <thread>
+#include <vector>
+
+#include "server/answer_head.h"
+#include "server/body_copy.h"
+#include "server/cgi_request.h"
+#include "server/file_offload.h"
+#include "server/limits.h"
+
+namespace web {
+namespace {
+
+constexpr int kResponder = 1;      // FCGI_RESPONDER, which no public header has
+constexpr int kLookAround = 1000;  // milliseconds between looks whether others need the thread
+
+/// A request of the web server, and the connection that it came by.
+class Channel {
+ public:
+  explicit Channel(int listening_socket);
+  Channel(const Channel &) = delete;
+  Channel &operator=(const Channel &) = delete;
+  ~Channel() { Cut(); }
+
+  /// Takes the next request, of the connection that was kept, else of a new one.
+  bool Accept() { return FCGX_Accept_r(&request_) == 0; }
+  /// Ends an answer that was given whole.
+  bool Finish();
+  /// Closes the connection: the web server sees that the answer is not whole.
+  void Cut() { FCGX_Free(&request_, 1); }
+
+  ssize_t Read(char *buffer, size_t size);
+  bool Write(std::string_view bytes);
+
+  /// -1 for none.
+  int connection() const { return request_.ipcFd; }
+  bool IsResponder() const { return request_.role == kResponder; }
+  const char *const *environment() const { return request_.envp; }
+
+ private:
+  FCGX_Request request_ = {};
+};
+
+Channel::Channel(int listening_socket) {
+  FCGX_InitRequest(&request_, listening_socket, FCGI_FAIL_ACCEPT_ON_INTR);
+}
+
+bool Channel::Finish() {
+  const bool is_sent = FCGX_FFlush(request_.out) == 0;
+  FCGX_Finish_r(&request_);
+  return is_sent;
+}
+
+ssize_t Channel::Read(char *buffer, size_t size) {
+  return FCGX_GetStr(buffer, static_cast<int>(size), request_.in);
+}
+
+bool Channel::Write(std::string_view bytes) {
+  const int size = static_cast<int>(bytes.size());
+  return FCGX_PutStr(bytes.data(), size, request_.out) == size;
+}
+
+bool IsReady(const pollfd &watched) {
+  return watched.revents != 0;
+}
+
+}  // namespace
+
+class FastCgiServerPrivate {
+ public:
+  FastCgiServerPrivate(int listening_socket, const Settings &settings, Service &service);
+  ~FastCgiServerPrivate();
+
+  void StopAccepting() { eventfd_write(stop_.get(), 1); }
+
+ private:
+  void Serve(std::atomic<int> &connection);
+  bool AcceptNext(Channel &channel);
+  bool AcceptNew(Channel &channel);
+  bool AcceptCounted(Channel &channel);
+  bool WaitForKept(Channel &channel);
+  bool IsStopped() const;
+
+  void Respond(Channel &channel);
+  bool Send(Response &response, Channel &channel, Visit &visit);
+
+  const int listening_socket_;
+  const FileOffload offload_;
+  Service &service_;
+  UniqueFd stop_;  ///< Readable when no more requests are to be taken.
+  std::mutex accepting_;
+  std::atomic<int> free_threads_ = 0;          ///< Waiting for new connections.
+  std::vector<std::atomic<int>> connections_;  ///< Of each thread; -1 for none.
+  std::vector<std::thread> threads_;
+};
+
+FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings &settings,
+                                           Service &service)
+    : listening_socket_(listening_socket),
+      offload_(settings),
+      service_(service),
+      stop_(eventfd(0, EFD_CLOEXEC)),
+      connections_(static_cast<size_t>(settings.threads)) {
+  if (!stop_.IsOpen() || FCGX_Init() != 0) throw std::runtime_error("FastCGI does not start");
+  for (std::atomic<int> &connection : connections_) {
+    connection = -1;
+    threads_.emplace_back([this, &connection] { Serve(connection); });
+  }
+}
+
+FastCgiServerPrivate::~FastCgiServerPrivate() {
+  StopAccepting();
+  for (const std::atomic<int> &connection : connections_) shutdown(connection, SHUT_RDWR);
+  for (std::thread &thread : threads_) thread.join();
+}
+
+void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
+  Channel channel(listening_socket_);
+  while (!IsStopped()) {
+    if (!AcceptNext(channel)) continue;
+    connection = channel.connection();
+    Respond(channel);
+    connection = -1;
+  }
+}
+
+bool FastCgiServerPrivate::AcceptNext(Channel &channel) {
+  if (channel.connection() < 0) return AcceptNew(channel);
+  return WaitForKept(channel) && AcceptCounted(channel);
+}
+
+bool FastCgiServerPrivate::AcceptNew(Channel &channel) {
+  ++free_threads_;
+  // One thread at a time looks at the socket, or a request would wake them all.
+  const std::lock_guard guard(accepting_);
+  pollfd watched[] = {{stop_.get(), POLLIN, 0}, {listening_socket_, POLLIN, 0}};
+  poll(watched, 2, -1);
+  --free_threads_;
+  return !IsReady(watched[0]) && IsReady(watched[1]) && AcceptCounted(channel);
+}
+
+bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {
+  service_.Begin();
+  if (channel.Accept()) return true;
+  service_.Drop();
+  return false;
+}
+
+bool FastCgiServerPrivate::WaitForKept(Channel &channel) {
+  pollfd watched[] = {{stop_.get(), POLLIN, 0}, {channel.connection(), POLLIN, 0}};
+  const int ready = poll(watched, 2, kLookAround);
+  if (ready == 0 && free_threads_ == 0) channel.Cut();
+  return ready > 0 && !IsReady(watched[0]);
+}
+
+bool FastCgiServerPrivate::IsStopped() const {
+  pollfd watched = {stop_.get(), POLLIN, 0};
+  return poll(&watched, 1, 0) > 0;
+}
+
+void FastCgiServerPrivate::Respond(Channel &channel) {
+  Visit visit;
+  CgiRequest cgi = ReadCgiRequest(channel.environment(), [&channel](char *buffer, size_t size) {
+    return channel.Read(buffer, size);
+  });
+  visit.address = cgi.request.remote_address;
+  visit.method = cgi.request.method;
+  // An authorizer's answer would let its visitor in to something else.
+  if (!channel.IsResponder()) cgi.refusal = 501;
+  Response response = cgi.refusal == 0 ? service_.Answer(cgi.request, visit.note)
+                                       : service_.Refuse(cgi.request, cgi.refusal);
+  visit.status = response.status;
+  visit.is_whole = Send(response, channel, visit) && channel.Finish();
+  if (!visit.is_whole) channel.Cut();
+  service_.End(visit);
+}
+
+bool FastCgiServerPrivate::Send(Response &response, Channel &channel, Visit &visit) {
+  const bool has_body = HasBody(response, visit.method);
+  const auto offloaded = has_body ? offload_.FieldFor(response) : std::nullopt;
+  if (offloaded) {
+    visit.bytes = BodyLength(response).value_or(0);
+    response.headers.Set(offloaded->first, offloaded->second);
+    response.body = std::unique_ptr<StreamBody>();  // of a length that the web server finds out
+    return channel.Write(CgiHead(response));
+  }
+  if (!channel.Write(CgiHead(response))) return false;
+  if (!has_body) return true;
+  const Copied copied = CopyBody(response, [&channel](const char *bytes, size_t size) {
+    return channel.Write({bytes, size});
+  });
+  visit.bytes = copied.bytes;
+  return copied.is_whole;
+}
+
+FastCgiServer::FastCgiServer(int listening_socket, const Settings &settings, Service &service)
+    : private_(std::make_unique<FastCgiServerPrivate>(listening_socket, settings, service)) {}
+
+FastCgiServer::~FastCgiServer() = default;
+
+void FastCgiServer::StopAccepting() {
+  private_->StopAccepting();
+}
+
+}  // namespace web

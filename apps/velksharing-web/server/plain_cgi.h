@@ -1,0 +1,17 @@
+#ifndef VELKSHARING_WEB_SERVER_PLAIN_CGI_H
+#define VELKSHARING_WEB_SERVER_PLAIN_CGI_H
+
+#include "server/service.h"
+
+namespace web {
+
+/// Whether a web server started this process to answer one request by CGI.
+bool IsPlainCgi();
+
+/// Answers that request: environment and standard input, to standard output.
+/// @return the process's exit status; not 0 when the answer could not be given whole.
+int ServePlainCgi(Service &service);
+
+}  // namespace web
+
+#endif

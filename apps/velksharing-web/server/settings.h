@@ -1,0 +1,65 @@
+#ifndef VELKSHARING_WEB_SERVER_SETTINGS_H
+#define VELKSHARING_WEB_SERVER_SETTINGS_H
+
+#include <sys/types.h>
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace web {
+
+/// How the bytes of files reach the visitor under FastCGI.
+enum class FileDelivery {
+  COPY,              ///< Through this program.
+  X_ACCEL_REDIRECT,  ///< The web server reads them, told by an internal address (nginx).
+  X_SENDFILE,        ///< The web server reads them, told by a path (lighttpd, Apache).
+};
+
+/// What VELK_ROOT/etc/sharing-web.conf and the command line decide. docs/man/velksharing-web.8
+/// tells what each key means; here they have their names, checked, with their defaults.
+struct Settings {
+  std::string listen;   ///< "" where neither `listen` nor `fastcgi` is given: the default address.
+  std::string fastcgi;  ///< Path of the FastCGI socket; "" for none.
+  mode_t socket_mode = 0660;
+  std::string socket_group;  ///< Name of an existing group; "" for this program's own.
+  int workers = 4;
+  int connections = 256;                     ///< Of one worker, embedded.
+  int threads = 16;                          ///< Of one worker, FastCGI.
+  int stop_timeout = 30;                     ///< In seconds.
+  std::vector<std::string> trusted_proxies;  ///< Addresses as the C library prints them, "unix".
+
+  std::string path = "/sharing";
+  std::string site_folder;
+  std::string product_name;
+  std::string runtime_folder = VELK_ROOT "/run/sharing-web";
+  long retry_after = 600;  ///< In seconds.
+
+  std::string access_log = "stderr";  ///< "off", "stderr", "syslog" or an absolute path.
+
+  FileDelivery file_delivery = FileDelivery::COPY;
+  std::vector<std::string> file_folders;  ///< Absolute, without a slash at the end.
+  std::string accel_location = "/velk-files";
+};
+
+/// The file that is read where the command line names no other.
+inline constexpr char kConfigPath[] = VELK_ROOT "/etc/sharing-web.conf";
+
+/// Where visitors are waited for when nothing else is said.
+inline constexpr char kDefaultListen[] = "127.0.0.1:8080";
+
+/// Puts one setting in.
+/// @throws velk::ConfigMistake naming the key.
+void Apply(std::string_view key, std::string_view value, Settings &settings);
+
+/// Settings of a file; a missing one leaves everything at its default.
+/// @throws velk::ConfigMistake naming file, line and key.
+Settings ReadSettings(const std::string &file);
+
+/// What only shows when all settings are known.
+/// @throws velk::ConfigMistake.
+void CheckTogether(const Settings &settings);
+
+}  // namespace web
+
+#endif
