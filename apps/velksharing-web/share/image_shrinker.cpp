@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cstdarg>
+#include <cstdint>
 #include <memory>
 
 #include "share/exif_orientation.h"
@@ -12,6 +13,7 @@
 namespace web::share {
 namespace {
 
+constexpr uint64_t kMostPixels = 70'000'000;
 constexpr int kJpegQuality = 80;
 constexpr int kPngLevel = 6;
 
@@ -30,6 +32,33 @@ bool IsJpeg(std::string_view bytes) {
   return StartsWith(bytes, "\xFF\xD8\xFF");
 }
 
+bool IsPng(std::string_view bytes) {
+  return StartsWith(bytes, "\x89PNG\r\n");
+}
+
+bool IsGif(std::string_view bytes) {
+  return StartsWith(bytes, "GIF8");
+}
+
+// A number of `width` bytes; 0 when there are not so many.
+uint64_t Number(std::string_view bytes, size_t place, size_t width, bool is_big_endian) {
+  if (bytes.size() < place + width) return 0;
+  uint64_t number = 0;
+  for (size_t index = 0; index < width; ++index) {
+    const size_t from = is_big_endian ? place + index : place + width - 1 - index;
+    number = number << 8 | static_cast<unsigned char>(bytes[from]);
+  }
+  return number;
+}
+
+// A few bytes can announce an image that takes all memory. The other formats have limits of their
+// own.
+bool IsTooLarge(std::string_view bytes) {
+  if (IsPng(bytes)) return Number(bytes, 16, 4, true) * Number(bytes, 20, 4, true) > kMostPixels;
+  if (IsGif(bytes)) return Number(bytes, 6, 2, false) * Number(bytes, 8, 2, false) > kMostPixels;
+  return false;
+}
+
 // gd knows colours that we do not.
 Image OpenJpeg(std::string_view bytes, int side) {
   if (gdImagePtr image = ReadJpeg(bytes, side)) return Image(image);
@@ -41,8 +70,8 @@ Image Open(std::string_view bytes, int side) {
   const int size = static_cast<int>(bytes.size());
   void *const data = const_cast<char *>(bytes.data());
   if (IsJpeg(bytes)) return OpenJpeg(bytes, side);
-  if (StartsWith(bytes, "\x89PNG\r\n")) return Image(gdImageCreateFromPngPtr(size, data));
-  if (StartsWith(bytes, "GIF8")) return Image(gdImageCreateFromGifPtr(size, data));
+  if (IsPng(bytes)) return Image(gdImageCreateFromPngPtr(size, data));
+  if (IsGif(bytes)) return Image(gdImageCreateFromGifPtr(size, data));
   if (StartsWith(bytes, "RIFF") && StartsWith(bytes.substr(8), "WEBP")) {
     return Image(gdImageCreateFromWebpPtr(size, data));
   }
@@ -116,7 +145,7 @@ std::string Encode(const Image &image) {
 
 std::string ShrinkImage(std::string_view bytes, int side) {
   gdSetErrorMethod(KeepSilent);
-  const Image image = Open(bytes, side);
+  const Image image = IsTooLarge(bytes) ? nullptr : Open(bytes, side);
   if (!image) return "";
   Image small = Shrink(image, side);
   if (small && IsJpeg(bytes)) small = Upright(std::move(small), ExifOrientation(bytes));
