@@ -95,7 +95,9 @@ std::string_view WithoutCutCharacter(std::string_view bytes) {
 bool SurvivesForms(std::string_view name) {
   while (!name.empty()) {
     const Character character = Decode(name);
-    if (character.length == 0 || character.code == '\n' || character.code == '\r') return false;
+    const bool is_changed =
+        character.code == '\0' || character.code == '\n' || character.code == '\r';
+    if (character.length == 0 || is_changed) return false;
     name.remove_prefix(character.length);
   }
   return true;

@@ -80,18 +80,18 @@ struct FileView {
   std::vector<std::string> path{};
   std::string name{};
   FileKind kind = FileKind::kOther;
-  std::string media_type{};  ///< "image/png"; shown, and given to audio and video elements.
+  std::string media_type{};  ///< "image/png"; for the site's own templates.
   uint64_t size = 0;         ///< In bytes.
   time_t modified = 0;
   /// Whether `?view` gives the content inline. Without it only `text` is previewed.
   bool can_view = false;
-  /// The beginning of a text file, of any encoding, at most Pages::kTextPreviewBytes; shown
-  /// escaped, for files of any kind.
+  /// The beginning of a text file in UTF-8; more than Pages::kTextPreviewBytes is cut off. Shown
+  /// in the place of any other preview.
   std::optional<std::string> text{};
   bool text_is_cut = false;  ///< Whether the file goes on behind `text`.
   bool can_download = true;
-  std::string
-      previous;  ///< Name of the file before and behind this one in the folder; "" for none.
+  /// Names of the files before and behind this one in the folder; "" for none.
+  std::string previous{};
   std::string next{};
 };
 
