@@ -49,6 +49,8 @@ constexpr std::array<uint32_t, 17> kCallsForComputing = {
     SYS_getpid,       SYS_gettid,
 };
 
+constexpr uint32_t kRefuse = SECCOMP_RET_ERRNO | EPERM;
+
 bool LimitTo(__rlimit_resource_t resource, rlim_t most) {
   const rlimit limit = {most, most};
   return setrlimit(resource, &limit) == 0;
@@ -94,8 +96,12 @@ bool DropCapabilities() {
 sock_filter Load(size_t offset) {
   return BPF_STMT(BPF_LD | BPF_W | BPF_ABS, static_cast<uint32_t>(offset));
 }
-sock_filter SkipUnlessEqual(uint32_t value, uint8_t skipped) {
-  return BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, value, 0, skipped);
+// Skips the next statement.
+sock_filter SkipUnlessEqual(uint32_t value) {
+  return BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, value, 0, 1);
+}
+sock_filter SkipIfEqual(uint32_t value) {
+  return BPF_JUMP(BPF_JMP | BPF_JEQ | BPF_K, value, 1, 0);
 }
 sock_filter Return(uint32_t action) {
   return BPF_STMT(BPF_RET | BPF_K, action);
@@ -106,14 +112,15 @@ bool AllowOnlyComputing() {
   if (kArchitecture == 0) return true;
   std::vector<sock_filter> filter = {
       Load(offsetof(seccomp_data, arch)),
-      SkipUnlessEqual(kArchitecture, 1),
+      SkipIfEqual(kArchitecture),
+      Return(kRefuse),
       Load(offsetof(seccomp_data, nr)),
   };
   for (const uint32_t call : kCallsForComputing) {
-    filter.push_back(SkipUnlessEqual(call, 1));
+    filter.push_back(SkipUnlessEqual(call));
     filter.push_back(Return(SECCOMP_RET_ALLOW));
   }
-  filter.push_back(Return(SECCOMP_RET_ERRNO | EPERM));
+  filter.push_back(Return(kRefuse));
   const sock_fprog program = {static_cast<unsigned short>(filter.size()), filter.data()};
   return prctl(PR_SET_SECCOMP, SECCOMP_MODE_FILTER, &program, 0, 0) == 0;
 }
@@ -128,9 +135,8 @@ void ForgetSignalHandlers() {
 
 bool Seal(const SealedLimits &limits, int result) {
   ForgetSignalHandlers();
-  return prctl(PR_SET_PDEATHSIG, SIGKILL) == 0 && prctl(PR_SET_DUMPABLE, 0) == 0 &&
-         LimitResources(limits) && CloseAllBut(result) && DropCapabilities() &&
-         AllowOnlyComputing();
+  return CloseAllBut(result) && DropCapabilities() && prctl(PR_SET_PDEATHSIG, SIGKILL) == 0 &&
+         prctl(PR_SET_DUMPABLE, 0) == 0 && LimitResources(limits) && AllowOnlyComputing();
 }
 
 bool WriteAll(int fd, const std::string &content) {
