@@ -1,0 +1,65 @@
+"""The servers that are measured side by side, and the pages on them."""
+
+import getpass
+import urllib.parse
+
+import apache
+from program import Program, configure, free_port
+from shared import PAGE_NAME
+from subject import Role, Subject
+
+HELLO_WORKERS = 4  # as many as velksharing-web has by itself
+
+
+def start_all(running, build, folder, shared):
+    """Starts every server until `running` ends, and returns what is measured on them."""
+    page = shared.page.read_bytes()
+    embedded, embedded_port = _start_embedded(running, build, folder)
+    web_socket, hello_socket = folder / 'web.socket', folder / 'hello.socket'
+    fastcgi = _start_fastcgi(running, build, folder, web_socket)
+    hello = running.enter_context(Program(
+        [build / 'bin' / 'velksharing_bench_hello', hello_socket, HELLO_WORKERS, shared.page],
+        folder / 'hello.output', path=hello_socket))
+    nginx_port = _start_nginx(running, folder / 'nginx', web_socket, hello_socket)
+    return [
+        *_own_pages('embedded', embedded, embedded_port, shared.link, page),
+        *_own_pages('nginx + FastCGI', fastcgi, nginx_port, shared.link, page),
+        Subject('hello, nginx + FastCGI', Role.HELLO, f'http://127.0.0.1:{nginx_port}/hello',
+                hello, page, page),
+        apache.start(running, folder / 'apache', shared, sessions=shared.links),
+    ]
+
+
+def _start_embedded(running, build, folder):
+    port = free_port()
+    words = [build / 'bin' / 'velksharing-web', '--listen', f'127.0.0.1:{port}',
+             '--access-log', folder / 'embedded.log']
+    return running.enter_context(Program(words, folder / 'embedded.output', port=port)), port
+
+
+def _start_fastcgi(running, build, folder, socket):
+    words = [build / 'bin' / 'velksharing-web', '--fastcgi', socket,
+             '--access-log', folder / 'fastcgi.log']
+    return running.enter_context(Program(words, folder / 'fastcgi.output', path=socket))
+
+
+def _start_nginx(running, folder, web_socket, hello_socket):
+    port = free_port()
+    folder.mkdir()
+    configuration = configure('nginx.conf', folder, {
+        'folder': folder, 'port': port, 'user': getpass.getuser(),
+        'web_socket': web_socket, 'hello_socket': hello_socket})
+    running.enter_context(Program(
+        ['nginx', '-p', folder, '-c', configuration, '-e', folder / 'error.log'],
+        folder / 'output', port=port))
+    return port
+
+
+def _own_pages(how, serving, port, link, page):
+    entrance = f'http://127.0.0.1:{port}/sharing/{link}'
+    return [
+        Subject(how, Role.CHECKED, f'{entrance}/{urllib.parse.quote(PAGE_NAME)}?view', serving,
+                page, page, entrance=entrance),
+        Subject(f'{how}: list of the folder', Role.TOLD, f'{entrance}/', serving,
+                PAGE_NAME.encode(), entrance=entrance),
+    ]

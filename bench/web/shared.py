@@ -1,0 +1,57 @@
+"""What is looked at: a small file in a folder, shared by a link among many others."""
+
+import contextlib
+import os
+import secrets
+import shutil
+from pathlib import Path
+
+import program
+from subject import Credentials
+
+PAGE_NAME = 'page.txt'
+PAGE_BYTES = 1024
+OTHER_FILES = ('second page.txt', 'third page.txt')
+
+
+class Shared:
+    """Makes the database and the link; at the end of the block both are gone."""
+
+    def __init__(self, build, folder, links):
+        self._programs = build / 'bin'
+        self._folder = folder
+        self._database = None
+        self.links = links
+        self.credentials = Credentials('visitor', secrets.token_urlsafe(12))
+        self.files = folder / 'shared'
+        self.page = self.files / PAGE_NAME
+        self.link = None  # its hash
+
+    def __enter__(self):
+        shutil.rmtree(self._folder, ignore_errors=True)
+        self.files.mkdir(parents=True)
+        for name in (PAGE_NAME, *OTHER_FILES):
+            (self.files / name).write_text(_text())
+        self._database = program.run([self._programs / 'velksharing_bench_links', self.links])
+        self.link = self._make_link()
+        return self
+
+    def __exit__(self, *_):
+        for suffix in ('', '-wal', '-shm'):
+            with contextlib.suppress(FileNotFoundError):
+                os.remove(self._database + suffix)
+        shutil.rmtree(self._folder, ignore_errors=True)
+
+    def _make_link(self):
+        secret = self._folder / 'password'
+        with open(os.open(secret, os.O_WRONLY | os.O_CREAT, 0o600), 'w') as file:
+            file.write(self.credentials.password + '\n')
+        return program.run([
+            self._programs / 'velksharing', 'link', 'create', '--project', 'files',
+            '--owner', program.plain_user(), '--path', self.files, '--title', 'Pages',
+            '--password-file', secret])
+
+
+def _text():
+    line = 'The quick brown fox jumps over the lazy dog, and nobody knows why.\n'
+    return (line * (PAGE_BYTES // len(line) + 1))[:PAGE_BYTES - 1] + '\n'
