@@ -1,5 +1,6 @@
 #include "server/answer_head.h"
 
+#include <microhttpd.h>
 #include <syslog.h>
 
 #include <algorithm>
@@ -21,11 +22,11 @@ bool IsOneLine(std::string_view text) {
   return std::none_of(text.begin(), text.end(), EndsLine);
 }
 
+}  // namespace
+
 bool IsBodiless(int status) {
   return status == kNoContent || status == kNotModified;
 }
-
-}  // namespace
 
 bool HasBody(const Response &response, const std::string &method) {
   return method != "HEAD" && !IsBodiless(response.status);
@@ -39,7 +40,8 @@ std::optional<uint64_t> BodyLength(const Response &response) {
 }
 
 std::string CgiHead(const Response &response) {
-  std::string head = "Status: " + std::to_string(response.status) + "\r\n";
+  const char *reason = MHD_get_reason_phrase_for(static_cast<unsigned>(response.status));
+  std::string head = "Status: " + std::to_string(response.status) + " " + reason + "\r\n";
   for (const auto &[name, value] : response.headers) {
     if (IsOneLine(name) && IsOneLine(value)) {
       head.append(name).append(": ").append(value).append("\r\n");

@@ -9,6 +9,9 @@
 
 namespace web {
 
+/// Whether answers of a status never have a body: 204 and 304.
+bool IsBodiless(int status);
+
 /// Whether an answer has a body on the wire: none for HEAD, 204 and 304.
 bool HasBody(const Response &response, const std::string &method);
 

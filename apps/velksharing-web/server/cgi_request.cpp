@@ -41,6 +41,11 @@ std::string FieldName(std::string_view name) {
   return field;
 }
 
+/// HTTP_PROXY would be read by programs as their own proxy; the others have variables of their own.
+bool IsLeftOut(std::string_view name) {
+  return name == "PROXY" || name == "CONTENT_TYPE" || name == "CONTENT_LENGTH";
+}
+
 Fields ReadFields(const char *const *environment) {
   constexpr std::string_view kPrefix = "HTTP_";
   Fields fields;
@@ -48,9 +53,8 @@ Fields ReadFields(const char *const *environment) {
     const std::string_view variable = *place;
     const size_t sign = variable.find('=');
     if (sign == std::string_view::npos || !variable.starts_with(kPrefix)) continue;
-    // HTTP_PROXY would be read by programs as their own proxy.
     const std::string_view name = variable.substr(kPrefix.size(), sign - kPrefix.size());
-    if (name != "PROXY") fields.Add(FieldName(name), std::string(variable.substr(sign + 1)));
+    if (!IsLeftOut(name)) fields.Add(FieldName(name), std::string(variable.substr(sign + 1)));
   }
   const std::string_view type = Variable(environment, "CONTENT_TYPE");
   if (!type.empty()) fields.Add("Content-Type", std::string(type));

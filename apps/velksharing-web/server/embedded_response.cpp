@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "server/answer_head.h"
 #include "server/limits.h"
 #include "server/printable.h"
 
@@ -48,7 +49,16 @@ MHD_Response *WithStream(std::unique_ptr<StreamBody> body, uint64_t &bytes) {
   return response;
 }
 
+/// An empty text would get the length 0, which 304 would tell of what the visitor has already.
+MHD_Response *WithoutBody() {
+  const auto nothing = [](void *, uint64_t, char *, size_t) -> ssize_t {
+    return MHD_CONTENT_READER_END_OF_STREAM;
+  };
+  return MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, 1, nothing, nullptr, nullptr);
+}
+
 MHD_Response *WithBody(Response &response, uint64_t &bytes) {
+  if (IsBodiless(response.status)) return WithoutBody();
   if (auto *text = std::get_if<std::string>(&response.body)) return WithText(std::move(*text));
   if (auto *file = std::get_if<FileBody>(&response.body)) return WithFile(*file);
   return WithStream(std::move(std::get<std::unique_ptr<StreamBody>>(response.body)), bytes);
