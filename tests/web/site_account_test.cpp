@@ -2,7 +2,7 @@
 #include <sys/socket.h>
 #include <sys/un.h>
 #include <unistd.h>
-#include <velk/velksdk.h>
+#include <velksharing/store.h>
 
 #include <cstring>
 #include <filesystem>
@@ -17,6 +17,8 @@ namespace fs = std::filesystem;
 namespace {
 
 using testing::HasSubstr;
+using VELK::sharing::db::EntryDB;
+using VELK::sharing::db::SharingDB;
 using velk_test::BodyOf;
 using velk_test::Browser;
 using velk_test::FieldList;
@@ -26,6 +28,7 @@ using web::Response;
 const char *const kLink = "/sharing/abc";
 const char *const kPassword = "right";
 constexpr unsigned int kOtherUid = 65534;
+constexpr unsigned int kNoUid = 3999999999u;
 
 /// Listens where saslauthd would, and takes one password, whatever the account.
 class Saslauthd {
@@ -143,12 +146,24 @@ TEST_F(SiteAccount, AMissingNameIsAskedForAgain) {
 TEST_F(SiteAccount, AnAccountThatIsNoLongerPermittedHasToLogInAgain) {
   Browser browser(site());
   browser.Submit(kLink, Credentials("root", kPassword));
-  RunSql("UPDATE entry SET data = replace(data, '\"protect_uids\":[0]', '\"protect_uids\":[" +
-         std::to_string(kOtherUid) + "]')");
-  RunSql("UPDATE session SET uid = " + std::to_string(kOtherUid - 1));
+  Entry entry;
+  EntryDB links(SharingDB::Instance());
+  ASSERT_TRUE(links.GetByHash("abc", entry));
+  ASSERT_TRUE(links.Update(entry.set_protect_uids({kOtherUid})));
   Response response = browser.Get(kLink);
   EXPECT_EQ(200, response.status);
   EXPECT_THAT(BodyOf(response), HasSubstr("name=\"zed_username\""));
+  EXPECT_EQ(-6, browser.note().code);
+}
+
+TEST_F(SiteAccount, AnAccountThatIsGoneHasToLogInAgain) {
+  Browser browser(site());
+  browser.Submit(kLink, Credentials("root", kPassword));
+  RunSql("UPDATE session SET uid = " + std::to_string(kNoUid));
+  Response response = browser.Get(kLink);
+  EXPECT_EQ(200, response.status);
+  EXPECT_THAT(BodyOf(response), HasSubstr("name=\"zed_username\""));
+  EXPECT_EQ(-4, browser.note().code);
 }
 
 }  // namespace

@@ -116,7 +116,7 @@ TEST_F(SiteHidden, LinksTakeTheSameTimeWhateverTheReason) {
   for (const std::string &hash : StoreHiddenLinks()) {
     const auto start = std::chrono::steady_clock::now();
     Browser(site()).Get("/sharing/" + hash);
-    EXPECT_LE(std::chrono::milliseconds(4), std::chrono::steady_clock::now() - start) << hash;
+    EXPECT_LE(std::chrono::milliseconds(2), std::chrono::steady_clock::now() - start) << hash;
   }
 }
 

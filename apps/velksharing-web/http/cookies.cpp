@@ -1,21 +1,11 @@
 #include "http/cookies.h"
 
-#include <strings.h>
-
 #include <algorithm>
+
+#include "http/text.h"
 
 namespace web {
 namespace {
-
-bool IsNamed(const Fields::Field &field, const char *name) {
-  return strcasecmp(field.first.c_str(), name) == 0;
-}
-
-std::string_view Trimmed(std::string_view text) {
-  const size_t begin = text.find_first_not_of(" \t");
-  if (begin == std::string_view::npos) return {};
-  return text.substr(begin, text.find_last_not_of(" \t") - begin + 1);
-}
 
 std::string_view Unquoted(std::string_view value) {
   if (value.size() >= 2 && value.front() == '"' && value.back() == '"')
@@ -27,12 +17,9 @@ std::string_view Unquoted(std::string_view value) {
 /// @return whether it is there.
 bool FindIn(std::string_view header, std::string_view name, std::string_view &value) {
   while (!header.empty()) {
-    const size_t end = std::min(header.find(';'), header.size());
-    const std::string_view pair = header.substr(0, end);
-    header.remove_prefix(std::min(end + 1, header.size()));
-    const size_t equals = pair.find('=');
-    if (equals == std::string_view::npos || Trimmed(pair.substr(0, equals)) != name) continue;
-    value = Unquoted(Trimmed(pair.substr(equals + 1)));
+    std::string_view pair = TakePart(header, ';');
+    if (Trimmed(TakePart(pair, '=')) != name) continue;
+    value = Unquoted(Trimmed(pair));
     return true;
   }
   return false;
@@ -51,7 +38,7 @@ bool IsCookieText(std::string_view text) {
 std::string_view FindCookie(const Request &request, std::string_view name) {
   std::string_view value;
   for (const Fields::Field &field : request.headers)
-    if (IsNamed(field, "Cookie") && FindIn(field.second, name, value)) break;
+    if (IsSameText(field.first, "Cookie") && FindIn(field.second, name, value)) break;
   return value;
 }
 

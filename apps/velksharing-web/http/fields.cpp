@@ -1,17 +1,14 @@
 #include "http/fields.h"
 
-#include <strings.h>
-
 #include <algorithm>
+
+#include "http/text.h"
 
 namespace web {
 namespace {
 
 auto Named(std::string_view name) {
-  return [name](const Fields::Field &field) {
-    return field.first.size() == name.size() &&
-           strncasecmp(field.first.data(), name.data(), name.size()) == 0;
-  };
+  return [name](const Fields::Field &field) { return IsSameText(field.first, name); };
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <algorithm>
 
 #include "http/percent.h"
+#include "http/text.h"
 #include "http/wipe.h"
 
 namespace web {
@@ -37,14 +38,10 @@ std::optional<Form> Form::Parse(std::string_view encoded) {
   Form form;
   form.fields_.reserve(count);
   while (!encoded.empty()) {
-    const size_t end = std::min(encoded.find('&'), encoded.size());
-    const std::string_view field = encoded.substr(0, end);
-    encoded.remove_prefix(std::min(end + 1, encoded.size()));
+    std::string_view field = TakePart(encoded, '&');
     if (field.empty()) continue;
-    const size_t equals = std::min(field.find('='), field.size());
     auto &[name, value] = form.fields_.emplace_back();
-    if (!Decode(field.substr(0, equals), name)) return std::nullopt;
-    if (equals < field.size() && !Decode(field.substr(equals + 1), value)) return std::nullopt;
+    if (!Decode(TakePart(field, '='), name) || !Decode(field, value)) return std::nullopt;
   }
   return form;
 }

@@ -1,19 +1,12 @@
 #include "http/percent.h"
 
+#include "http/text.h"
+
 namespace web {
 namespace {
 
-/// @return 0 to 15, or -1 for what is no hexadecimal digit.
-int HexDigitValue(char digit) {
-  if (digit >= '0' && digit <= '9') return digit - '0';
-  if (digit >= 'a' && digit <= 'f') return digit - 'a' + 10;
-  if (digit >= 'A' && digit <= 'F') return digit - 'A' + 10;
-  return -1;
-}
-
 bool IsUnreserved(char byte) {
-  return (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z') ||
-         (byte >= '0' && byte <= '9') || byte == '-' || byte == '.' || byte == '_' || byte == '~';
+  return IsLetterOrDigit(byte) || byte == '-' || byte == '.' || byte == '_' || byte == '~';
 }
 
 }  // namespace

@@ -3,11 +3,11 @@
 #include <openssl/crypto.h>
 #include <openssl/evp.h>
 #include <openssl/hmac.h>
-#include <strings.h>
 #include <sys/random.h>
 
 #include <algorithm>
 
+#include "http/text.h"
 #include "http/wipe.h"
 
 namespace web {
@@ -27,7 +27,7 @@ std::string LowercaseHex(const unsigned char *bytes, size_t length) {
 }
 
 bool IsLowercaseHexDigit(char byte) {
-  return (byte >= '0' && byte <= '9') || (byte >= 'a' && byte <= 'f');
+  return IsDigit(byte) || (byte >= 'a' && byte <= 'f');
 }
 
 /// "example.org:8080" of an origin such as "https://example.org:8080"; "" when it is none.
@@ -44,9 +44,7 @@ std::string_view WithoutUsualPort(std::string_view authority) {
 }
 
 bool IsSameHost(std::string_view one, std::string_view other) {
-  one = WithoutUsualPort(one);
-  other = WithoutUsualPort(other);
-  return one.size() == other.size() && strncasecmp(one.data(), other.data(), one.size()) == 0;
+  return IsSameText(WithoutUsualPort(one), WithoutUsualPort(other));
 }
 
 }  // namespace

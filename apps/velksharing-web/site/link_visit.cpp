@@ -19,7 +19,7 @@ using VELK::sharing::record::Entry;
 
 /// How long a link that lets nobody in takes to say so. More than any of the reasons needs, so
 /// that nobody tells them apart by a clock.
-constexpr milliseconds kHiddenTime(4);
+constexpr milliseconds kHiddenTime(2);
 constexpr milliseconds kLockPatience(15000);
 constexpr long kUnavailableSeconds = 10;
 
@@ -52,14 +52,14 @@ LinkVisit::LinkVisit(const SiteParts &site, const Answers &answers, const Reques
 
 Response LinkVisit::Look(const SharedRequest &wanted) {
   note_.route = "page";
-  if (visitor_.session_id().empty()) return LookFromOutside(wanted);
+  if (visitor_.session_id().empty()) return LookFromOutside(FindLink(hash_), wanted);
   const Result result = Noted(Authorize(hash_, visitor_.session_id()));
   const std::optional<Link> link = FindLink(hash_);
   if (result.code == VELK_SHARING_AUTH_OK)
     return link ? Show(*link, wanted) : Hidden(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (result.code == VELK_SHARING_AUTH_UNUSABLE && !(link && MayLackItsAccount(*link)))
     return Unavailable(result);
-  return LookFromOutside(wanted);
+  return LookFromOutside(link, wanted);
 }
 
 Response LinkVisit::LogIn(const Form &form) {
@@ -85,8 +85,7 @@ Response LinkVisit::LogOut(const Form &form) {
   return response;
 }
 
-Response LinkVisit::LookFromOutside(const SharedRequest &wanted) {
-  const std::optional<Link> link = FindLink(hash_);
+Response LinkVisit::LookFromOutside(const std::optional<Link> &link, const SharedRequest &wanted) {
   if (!link || !AdmitsVisitors(*link)) return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (wanted.query.Has(kFarewellParameter) && !answers_.wants_json()) return Farewell(*link);
   if (link->IsOpen() && !link->HasUseLimit() && !visitor_.OnlyPeeks())

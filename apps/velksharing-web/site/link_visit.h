@@ -2,6 +2,7 @@
 #define VELKSHARING_WEB_SITE_LINK_VISIT_H
 
 #include <chrono>
+#include <optional>
 #include <string>
 
 #include "http/form.h"
@@ -47,7 +48,7 @@ class LinkVisit {
 
  private:
   // Ways in, and what is behind.
-  Response LookFromOutside(const SharedRequest &wanted);
+  Response LookFromOutside(const std::optional<Link> &link, const SharedRequest &wanted);
   Response EnterByLooking(const Link &link, const SharedRequest &wanted);
   Result LogInOneByOne(const Link &link, const Form &form, std::string &session_id);
   Response Show(const Link &link, const SharedRequest &wanted);

@@ -1,32 +1,20 @@
 #include "site/redirect_target.h"
 
 #include <arpa/inet.h>
-#include <strings.h>
 
 #include <algorithm>
 #include <string>
+
+#include "http/text.h"
 
 namespace web {
 namespace {
 
 constexpr size_t kLongest = 2048;
 
-bool IsDigit(char byte) {
-  return byte >= '0' && byte <= '9';
-}
-
-bool IsLetterOrDigit(char byte) {
-  return IsDigit(byte) || (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z');
-}
-
-bool IsHexDigit(char byte) {
-  return IsDigit(byte) || (byte >= 'a' && byte <= 'f') || (byte >= 'A' && byte <= 'F');
-}
-
 /// Takes `prefix` away from the front of `text`, whatever its case.
 bool TakePrefix(std::string_view &text, std::string_view prefix) {
-  if (text.size() < prefix.size() || strncasecmp(text.data(), prefix.data(), prefix.size()) != 0)
-    return false;
+  if (!IsSameText(text.substr(0, prefix.size()), prefix)) return false;
   text.remove_prefix(prefix.size());
   return true;
 }
@@ -90,7 +78,8 @@ bool IsRest(std::string_view rest) {
   constexpr std::string_view kMarks = "-._~!$&'()*+,;=:@/?#[]";
   for (size_t at = 0; at < rest.size(); ++at) {
     if (rest[at] == '%') {
-      if (rest.size() - at < 3 || !IsHexDigit(rest[at + 1]) || !IsHexDigit(rest[at + 2]))
+      if (rest.size() - at < 3 || HexDigitValue(rest[at + 1]) < 0 ||
+          HexDigitValue(rest[at + 2]) < 0)
         return false;
     } else if (!IsLetterOrDigit(rest[at]) && kMarks.find(rest[at]) == std::string_view::npos) {
       return false;

@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "http/path.h"
+#include "http/text.h"
 
 namespace web {
 namespace {
@@ -12,10 +13,7 @@ namespace {
 constexpr size_t kLongestHash = 64;
 
 bool IsHash(std::string_view text) {
-  return !text.empty() && text.size() <= kLongestHash && std::ranges::all_of(text, [](char byte) {
-    return (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z') ||
-           (byte >= '0' && byte <= '9');
-  });
+  return !text.empty() && text.size() <= kLongestHash && std::ranges::all_of(text, IsLetterOrDigit);
 }
 
 bool IsHealth(std::string_view below, bool is_at_root) {

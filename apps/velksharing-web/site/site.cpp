@@ -1,6 +1,5 @@
 #include "site/site.h"
 
-#include <strings.h>
 #include <syslog.h>
 #include <velksharing/constants.h>
 #include <velksharing/database.h>
@@ -12,6 +11,7 @@
 #include <utility>
 
 #include "http/form.h"
+#include "http/text.h"
 #include "http/wipe.h"
 #include "site/answers.h"
 #include "site/cgi_environment.h"
@@ -44,9 +44,7 @@ std::string Shortened(const std::string &hash) {
 
 bool IsFormType(std::string_view content_type) {
   constexpr std::string_view kForm = "application/x-www-form-urlencoded";
-  std::string_view type = content_type.substr(0, content_type.find(';'));
-  while (type.ends_with(' ')) type.remove_suffix(1);
-  return type.size() == kForm.size() && strncasecmp(type.data(), kForm.data(), kForm.size()) == 0;
+  return IsSameText(Trimmed(TakePart(content_type, ';')), kForm);
 }
 
 Response PlainText(int status, const char *text) {

@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "http/cookies.h"
+#include "http/text.h"
 #include "site/cgi_environment.h"
 
 namespace web {
@@ -22,8 +23,7 @@ const std::string *FindSessionField(const Request &request) {
 }
 
 bool IsSessionIdByte(char byte) {
-  return (byte >= 'a' && byte <= 'z') || (byte >= 'A' && byte <= 'Z') ||
-         (byte >= '0' && byte <= '9') || byte == '-' || byte == '_';
+  return IsLetterOrDigit(byte) || byte == '-' || byte == '_';
 }
 
 bool IsSessionId(std::string_view text) {
