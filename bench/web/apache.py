@@ -18,10 +18,14 @@ MODULES = '/usr/lib/apache2/modules'
 PROCESSES = 1
 THREADS = 64
 SESSION_SECONDS = 3600
+# By itself, each UPDATE is on the disk before the answer goes out, and a busy database is tried
+# again after 100 ms.
+RELAXED = ('PRAGMA synchronous = NORMAL', 'PRAGMA busy_timeout = 10000')
 
 
-def start(running, folder, shared, sessions):
-    """Starts it until `running` ends, with `sessions` sessions of other people in its database."""
+def start(running, folder, shared, role):
+    """Starts it until `running` ends. Its database has as many sessions of other people as there
+    are links. Returns what is measured on it."""
     port = program.free_port()
     documents, private = folder / 'documents', folder / 'private'
     for made in (folder, documents, private):
@@ -29,17 +33,19 @@ def start(running, folder, shared, sessions):
     shutil.copy(shared.page, documents / PAGE_NAME)
     shutil.copy(program.HERE / 'login.html', documents / 'login.html')
     _write_account(folder / 'passwords', shared.credentials)
-    _make_sessions(private / 'sessions.db', sessions)
+    _make_sessions(private / 'sessions.db', shared.links)
     user, group = _identity(private)
+    settings = RELAXED if role is Role.APACHE_RELAXED else ()
     configuration = program.configure('apache.conf', folder, {
         'folder': folder, 'port': port, 'user': user, 'group': group, 'modules': MODULES,
         'processes': PROCESSES, 'threads': THREADS, 'all_threads': PROCESSES * THREADS,
-        'seconds': SESSION_SECONDS})
+        'seconds': SESSION_SECONDS,
+        'database_settings': '\n'.join(f'DBDInitSQL "{setting}"' for setting in settings)})
     serving = running.enter_context(program.Program(
         ['apache2', '-D', 'FOREGROUND', '-f', configuration], folder / 'output', port=port))
     page = shared.page.read_bytes()
     address = f'http://127.0.0.1:{port}/{PAGE_NAME}'
-    return Subject('Apache', Role.APACHE, address, serving, page, page, entrance=address)
+    return Subject(role.value, role, address, serving, page, page, entrance=address)
 
 
 def _identity(private):

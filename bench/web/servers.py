@@ -24,9 +24,10 @@ def start_all(running, build, folder, shared):
     return [
         *_own_pages('embedded', embedded, embedded_port, shared.link, page),
         *_own_pages('nginx + FastCGI', fastcgi, nginx_port, shared.link, page),
-        Subject('hello, nginx + FastCGI', Role.HELLO, f'http://127.0.0.1:{nginx_port}/hello',
+        Subject('hello: nginx + FastCGI', Role.HELLO, f'http://127.0.0.1:{nginx_port}/hello',
                 hello, page, page),
-        apache.start(running, folder / 'apache', shared, sessions=shared.links),
+        apache.start(running, folder / 'apache', shared, Role.APACHE),
+        apache.start(running, folder / 'apache-relaxed', shared, Role.APACHE_RELAXED),
     ]
 
 

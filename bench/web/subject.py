@@ -9,10 +9,13 @@ from visitor import LoginForm, Visitor
 
 
 class Role(enum.Enum):
-    CHECKED = 'what the targets are about'
+    """What a subject is measured for, and the name of those that others are compared with."""
+
+    CHECKED = 'ours, and what the targets are about'
     TOLD = 'ours, too, but does more than the others'
-    HELLO = 'does nothing'
-    APACHE = 'does the same by other means'
+    HELLO = 'hello'
+    APACHE = 'Apache'
+    APACHE_RELAXED = 'Apache relaxed'
 
 
 @dataclass(frozen=True)
