@@ -195,6 +195,15 @@ TEST(PasswordPage, CallsALinkWithoutTitleSharedFiles) {
   EXPECT_THAT(Pages({}).Password(kEnglish, {.link = Link("")}), HasSubstr("Shared files"));
 }
 
+TEST(LoginPages, OfferNothingToLeave) {
+  const Pages pages({});
+  const LoginView view{.link = Link()};
+  for (const std::string &page : {pages.Password(kEnglish, view), pages.Account(kEnglish, view),
+                                  pages.Open(kEnglish, view)}) {
+    EXPECT_THAT(page, Not(HasSubstr("logout")));
+  }
+}
+
 TEST(AccountPage, KeepsTheNameAndAsksForThePassword) {
   const Pages pages({.account_field = "who", .account_password_field = "word"});
   const std::string page = pages.Account(

@@ -18,6 +18,12 @@ struct Frame {
   std::string refresh;  ///< Where the page goes on to by itself; "" when it stays.
 };
 
+/// The link as it is for those who are not in: there is nothing to leave.
+LinkView FromOutside(LinkView link) {
+  link.can_log_out = false;
+  return link;
+}
+
 /// Seconds as the catalogue says them, rounded up to what people count in.
 std::string RetryText(const Catalogue &texts, long seconds) {
   constexpr long kMinute = 60;
@@ -89,7 +95,7 @@ class PagesPrivate {
     data.set("password_field", settings.password_field);
     data.set("account_field", settings.account_field);
     data.set("account_password_field", settings.account_password_field);
-    return Document(reader, {page, texts.Text(page + "_window"), view.link, ""}, data);
+    return Document(reader, {page, texts.Text(page + "_window"), FromOutside(view.link), ""}, data);
   }
 
   const PagesSettings settings;
@@ -188,10 +194,8 @@ std::string Pages::File(const Reader &reader, const FileView &view) const {
 std::string Pages::LoggedOut(const Reader &reader, const LinkView &link) const {
   Data data;
   data.set("action", private_->addresses.Link(link.hash));
-  LinkView left = link;
-  left.can_log_out = false;
   const std::string title = private_->Texts(reader).Text("logged_out_window");
-  return private_->Document(reader, {"logged_out", title, left, ""}, data);
+  return private_->Document(reader, {"logged_out", title, FromOutside(link), ""}, data);
 }
 
 std::string Pages::Message(const Reader &reader, int status, long retry_after) const {

@@ -26,7 +26,8 @@ struct Reader {
 struct LinkView {
   std::string hash{};
   std::string title{};  ///< "" for none: the page then speaks of "shared files".
-  /// Whether there is something to leave: shows the button that posts to base/HASH/logout.
+  /// Whether there is something to leave: shows the button that posts to base/HASH/logout. Never
+  /// shown on the pages in front of a link.
   bool can_log_out = false;
   /// Where the link's owner wants visitors to go on; "" for none. An http(s) address, checked by
   /// the caller; anything else is left out.
