@@ -119,6 +119,7 @@ TEST(ShareListing, AFolderThatItsOwnerMayNoLongerReadHasNone) {
   ASSERT_TRUE(item);
   chmod(folder.File("sub").c_str(), 0);
   EXPECT_FALSE(ReadListing(tree, *item, {}));
+  chmod(folder.File("sub").c_str(), 0755);  // or it could not be removed
 }
 
 TEST(ShareListing, LeavesOutWhatIsNeitherFileNorFolder) {

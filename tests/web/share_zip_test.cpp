@@ -35,9 +35,9 @@ using velk_test::WriteFile;
 using web::Response;
 using web::StreamBody;
 using web::share::kMaxZipDepth;
-using web::share::kMaxZipEntries;
 using web::share::MakeZip;
 using web::share::SharedTree;
+using web::share::ZipWalk;
 using web_test::SharedFolder;
 
 using Parts = std::vector<std::string>;
@@ -387,12 +387,15 @@ TEST_F(ShareZipMeanwhile, AFileThatIsRemovedIsInAllTheSame) {
   EXPECT_EQ(Finish(), "None 1000000\n");
 }
 
-TEST_F(ShareZipMeanwhile, NothingIsHeldOfAnArchiveThatIsNotReadToItsEnd) {
-  EXPECT_THAT(velk_test::RunForked([&] {
-                response_.reset();
-                return 0;
-              }),
-              0);
+TEST_F(ShareZipMeanwhile, NothingStaysOpenOfAnArchiveThatIsNotReadToItsEnd) {
+  const auto open_files = [] {
+    return std::distance(std::filesystem::directory_iterator("/proc/self/fd"),
+                         std::filesystem::directory_iterator());
+  };
+  const auto before = open_files();
+  response_.reset();
+  // The tree, the folder and the file in it.
+  EXPECT_EQ(before - open_files(), 3);
 }
 
 // --- Limits -------------------------------------------------------------------------------------
@@ -415,6 +418,26 @@ TEST(ShareZip, TakesAFolderThatIsAlmostTooDeep) {
   Response response = ZipOf(folder);
   std::string content;
   EXPECT_TRUE(ReadAll(BodyOf(response), content));
+}
+
+TEST(ShareZip, GoesThroughNoMoreEntriesThanItMay) {
+  const SharedFolder folder;
+  for (const std::string name : {"1", "2", "3", "4"}) folder.AddFile(name);
+  const LogCapture log;
+  ZipWalk walk(folder.Tree(), {}, {}, 3);
+  size_t entries = 0;
+  while (walk.Next()) ++entries;
+  EXPECT_EQ(entries, 3u);
+  EXPECT_TRUE(walk.HasFailed());
+  EXPECT_THAT(log.Texts(), ElementsAre(HasSubstr("too many entries")));
+}
+
+TEST(ShareZip, GoesThroughAsManyEntriesAsItMay) {
+  const SharedFolder folder;
+  for (const std::string name : {"1", "2", "3"}) folder.AddFile(name);
+  ZipWalk walk(folder.Tree(), {}, {}, 3);
+  while (walk.Next()) continue;
+  EXPECT_FALSE(walk.HasFailed());
 }
 
 TEST(ShareZip, LeavesNothingOfItsWorkInTheThread) {

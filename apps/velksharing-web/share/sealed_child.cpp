@@ -42,11 +42,11 @@ constexpr uint32_t kArchitecture = AUDIT_ARCH_AARCH64;
 constexpr uint32_t kArchitecture = 0;
 #endif
 
-constexpr std::array<uint32_t, 17> kCallsForComputing = {
+constexpr std::array<uint32_t, 18> kCallsForComputing = {
     SYS_brk,          SYS_mmap,      SYS_munmap,         SYS_mremap,        SYS_mprotect,
     SYS_madvise,      SYS_write,     SYS_futex,          SYS_exit,          SYS_exit_group,
     SYS_rt_sigreturn, SYS_getrandom, SYS_rt_sigprocmask, SYS_clock_gettime, SYS_sched_yield,
-    SYS_getpid,       SYS_gettid,
+    SYS_getpid,       SYS_gettid,    SYS_sigaltstack,
 };
 
 constexpr uint32_t kRefuse = SECCOMP_RET_ERRNO | EPERM;

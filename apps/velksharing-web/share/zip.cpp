@@ -34,7 +34,8 @@ std::string NameInArchive(const std::string &name) {
 class ZipBody : public StreamBody {
  public:
   ZipBody(SharedTree tree, const Item &folder, std::vector<std::string> names)
-      : walk_(std::move(tree), folder.parts, std::move(names)), depth_(folder.parts.size()) {}
+      : walk_(std::move(tree), folder.parts, std::move(names), kMaxZipEntries),
+        depth_(folder.parts.size()) {}
 
   ssize_t Read(char *buffer, size_t capacity) override {
     while (Untaken() == 0 && !is_finished_) {

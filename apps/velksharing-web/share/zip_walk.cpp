@@ -27,8 +27,11 @@ void LogLeftOut(const Parts &parts) {
 
 }  // namespace
 
-ZipWalk::ZipWalk(SharedTree tree, Parts folder, Parts names)
-    : tree_(std::move(tree)), folder_(std::move(folder)), names_(std::move(names)) {
+ZipWalk::ZipWalk(SharedTree tree, Parts folder, Parts names, size_t max_entries)
+    : tree_(std::move(tree)),
+      folder_(std::move(folder)),
+      names_(std::move(names)),
+      max_entries_(max_entries) {
   std::reverse(names_.begin(), names_.end());
   if (names_.empty()) Descend(folder_);
 }
@@ -40,7 +43,7 @@ std::optional<Item> ZipWalk::Next() {
       LogLeftOut(*parts);
       continue;
     }
-    if (++visited_ > kMaxZipEntries) Fail("it has too many entries");
+    if (++visited_ > max_entries_) Fail("it has too many entries");
     if (item->is_folder) Descend(std::move(*parts));
     if (has_failed_) return std::nullopt;
     return item;

@@ -17,7 +17,9 @@ class ZipWalk {
  public:
   /// @param folder where it is in the tree.
   /// @param names what to visit there; none for everything.
-  ZipWalk(SharedTree tree, std::vector<std::string> folder, std::vector<std::string> names);
+  /// @param max_entries how many are visited at most.
+  ZipWalk(SharedTree tree, std::vector<std::string> folder, std::vector<std::string> names,
+          size_t max_entries);
 
   /// Opens the next one; nothing at the end and after a failure.
   std::optional<Item> Next();
@@ -40,6 +42,7 @@ class ZipWalk {
   std::vector<std::string> folder_;
   std::vector<std::string> names_;  ///< Those to come, the next one last.
   std::vector<Level> levels_;
+  size_t max_entries_;
   size_t visited_ = 0;
   bool has_failed_ = false;
 };

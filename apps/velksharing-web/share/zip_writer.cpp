@@ -42,8 +42,8 @@ struct EntryCloser {
 
 void ZipWriter::Closer::operator()(archive *writer) const {
   const Utf8Scope utf8;
-  // An archive that is not finished stays so.
-  archive_write_fail(writer);
+  // Ends what has been begun, too, into the output that nobody takes any more: otherwise the
+  // library forgets to give back what it compresses with.
   archive_write_free(writer);
 }
 
