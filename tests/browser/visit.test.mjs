@@ -1,6 +1,7 @@
 // Visits to the running program, from the first page to logging out.
 import assert from "node:assert/strict";
 import { readFileSync } from "node:fs";
+import { createServer } from "node:http";
 import { join } from "node:path";
 import { after, before, describe, it } from "node:test";
 import { expectAccessible, expectNoOverflow, launch, newPage } from "./support/browser.mjs";
@@ -245,6 +246,23 @@ describe("a link with a password", () => {
       { colorScheme },
     );
   }
+});
+
+describe("a link that leads elsewhere", () => {
+  visit(
+    "goes on there after the login",
+    async (page) => {
+      const elsewhere = createServer((request, response) => response.end("elsewhere"));
+      await new Promise((resolve) => elsewhere.listen(0, "127.0.0.1", resolve));
+      const target = `http://127.0.0.1:${elsewhere.address().port}/album?a=1&b=2`;
+      const address = world.shareWithPassword("--redirect", "always", "--redirect-uri", target);
+      await enter(page, address);
+      await page.waitForURL(target);
+      assert.equal(await page.locator("body").innerText(), "elsewhere");
+      elsewhere.close();
+    },
+    withoutScript,
+  );
 });
 
 describe("a link for accounts", () => {
