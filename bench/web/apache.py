@@ -16,7 +16,7 @@ from subject import Role, Subject
 
 MODULES = '/usr/lib/apache2/modules'
 PROCESSES = 1
-THREADS = 64
+THREADS = 96  # more than there are connections
 SESSION_SECONDS = 3600
 # By itself, each UPDATE is on the disk before the answer goes out, and a busy database is tried
 # again after 100 ms.

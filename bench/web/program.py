@@ -35,9 +35,10 @@ class Program:
 
     def __enter__(self):
         with self._output.open('wb') as output:
-            # It also ends when this process is killed.
+            # It also ends when this process is killed. A group of its own, for some servers send
+            # signals to their whole group.
             self._process = subprocess.Popen(
-                ['setpriv', '--pdeathsig', 'TERM', *self._words],
+                ['setpriv', '--pdeathsig', 'TERM', *self._words], start_new_session=True,
                 stdin=subprocess.DEVNULL, stdout=output, stderr=output)
         try:
             self._wait_until_ready()
