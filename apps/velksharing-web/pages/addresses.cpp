@@ -1,17 +1,16 @@
 #include "pages/addresses.h"
 
-#include <strings.h>
-
 #include <algorithm>
 #include <utility>
 
 #include "http/percent.h"
+#include "http/text.h"
 
 namespace web {
 namespace {
 
 bool StartsWith(std::string_view text, std::string_view start) {
-  return text.size() > start.size() && strncasecmp(text.data(), start.data(), start.size()) == 0;
+  return text.size() > start.size() && IsSameText(text.substr(0, start.size()), start);
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "http/text.h"
 #include "pages/embedded_files.h"
 
 namespace web {
@@ -33,8 +34,7 @@ std::string LanguageOf(std::string_view name) {
 /// Whether it may stand in the attribute `lang`: "de", "pt-BR".
 bool IsLanguageTag(std::string_view text) {
   const bool is_plain = std::all_of(text.begin(), text.end(), [](char character) {
-    return (character >= 'a' && character <= 'z') || (character >= 'A' && character <= 'Z') ||
-           (character >= '0' && character <= '9') || character == '-';
+    return IsLetterOrDigit(character) || character == '-';
   });
   return is_plain && text.size() >= 2 && text.size() <= 35 && text[0] != '-';
 }

@@ -1,9 +1,9 @@
 #include "pages/language_choice.h"
 
-#include <strings.h>
-
 #include <algorithm>
 #include <optional>
+
+#include "http/text.h"
 
 namespace web {
 namespace {
@@ -14,21 +14,6 @@ struct Wish {
   int quality = 1000;
 };
 
-std::string_view Trimmed(std::string_view text) {
-  constexpr std::string_view kBlanks = " \t";
-  const size_t begin = text.find_first_not_of(kBlanks);
-  if (begin == std::string_view::npos) return {};
-  return text.substr(begin, text.find_last_not_of(kBlanks) - begin + 1);
-}
-
-/// Takes what stands before the next `separator` off `text`, and the separator too.
-std::string_view TakePart(std::string_view &text, char separator) {
-  const size_t end = std::min(text.find(separator), text.size());
-  const std::string_view part = Trimmed(text.substr(0, end));
-  text.remove_prefix(std::min(end + 1, text.size()));
-  return part;
-}
-
 /// "0.85" as 850. Nothing for what is no number from 0 to 1 with at most three decimals.
 std::optional<int> Quality(std::string_view text) {
   if (text.empty() || text.size() > 5 || (text[0] != '0' && text[0] != '1')) return {};
@@ -36,7 +21,7 @@ std::optional<int> Quality(std::string_view text) {
   int quality = (text[0] - '0') * 1000;
   int worth = 100;
   for (const char digit : text.substr(std::min<size_t>(2, text.size()))) {
-    if (digit < '0' || digit > '9') return {};
+    if (!IsDigit(digit)) return {};
     quality += (digit - '0') * worth;
     worth /= 10;
   }
@@ -45,12 +30,12 @@ std::optional<int> Quality(std::string_view text) {
 }
 
 std::optional<Wish> ReadWish(std::string_view text) {
-  Wish wish{TakePart(text, ';')};
+  Wish wish{Trimmed(TakePart(text, ';'))};
   if (wish.tag.empty()) return {};
   while (!text.empty()) {
     std::string_view parameter = TakePart(text, ';');
-    const std::string_view name = TakePart(parameter, '=');
-    if (name != "q" && name != "Q") continue;
+    const std::string_view name = Trimmed(TakePart(parameter, '='));
+    if (!IsSameText(name, "q")) continue;
     const std::optional<int> quality = Quality(Trimmed(parameter));
     if (!quality) return {};
     wish.quality = *quality;
@@ -66,13 +51,9 @@ std::vector<Wish> ReadWishes(std::string_view field) {
   return wishes;
 }
 
-bool AreAlike(std::string_view left, std::string_view right) {
-  return left.size() == right.size() && strncasecmp(left.data(), right.data(), left.size()) == 0;
-}
-
 /// Whether `tag` is `start` or a kind of it: "de-CH" of "de".
 bool IsKindOf(std::string_view tag, std::string_view start) {
-  return AreAlike(tag.substr(0, start.size()), start) &&
+  return IsSameText(tag.substr(0, start.size()), start) &&
          (tag.size() == start.size() || tag[start.size()] == '-');
 }
 
@@ -82,7 +63,7 @@ bool Fits(const Wish &wish, std::string_view language) {
 
 bool IsRefused(const std::vector<Wish> &wishes, std::string_view language) {
   return std::any_of(wishes.begin(), wishes.end(), [language](const Wish &wish) {
-    return wish.quality == 0 && AreAlike(wish.tag, language);
+    return wish.quality == 0 && IsSameText(wish.tag, language);
   });
 }
 

@@ -3,45 +3,22 @@
 #include <algorithm>
 #include <cstdint>
 
+#include "http/utf8.h"
+
 namespace web {
 namespace {
 
 constexpr std::string_view kReplacement = "\xEF\xBF\xBD";
 
-/// One character of UTF-8; `length` 0 when the bytes are none.
-struct Character {
-  uint32_t code = 0;
-  size_t length = 0;
-};
-
-bool IsContinuation(char byte) {
-  return (static_cast<unsigned char>(byte) & 0xC0) == 0x80;
-}
-
-/// How long the character is that begins with `first`; 0 when none does.
-size_t LengthFrom(unsigned char first) {
-  if (first < 0x80) return 1;
-  if (first >= 0xC2 && first <= 0xDF) return 2;
-  if (first >= 0xE0 && first <= 0xEF) return 3;
-  if (first >= 0xF0 && first <= 0xF4) return 4;
-  return 0;
-}
-
-Character Decode(std::string_view bytes) {
-  constexpr uint32_t kSmallest[] = {0, 0, 0x80, 0x800, 0x10000};
+/// The number of the character that `bytes`, its UTF-8, are.
+uint32_t CodeOf(std::string_view bytes) {
   const auto first = static_cast<unsigned char>(bytes.front());
-  const size_t length = LengthFrom(first);
-  if (length == 1) return {first, 1};
-  if (length == 0 || length > bytes.size()) return {};
-
-  uint32_t code = first & (0xFFu >> (length + 1));
-  for (const char byte : bytes.substr(1, length - 1)) {
-    if (!IsContinuation(byte)) return {};
+  if (bytes.size() == 1) return first;
+  uint32_t code = first & (0xFFu >> (bytes.size() + 1));
+  for (const char byte : bytes.substr(1)) {
     code = code << 6 | (static_cast<unsigned char>(byte) & 0x3Fu);
   }
-  const bool is_surrogate = code >= 0xD800 && code <= 0xDFFF;
-  if (code < kSmallest[length] || code > 0x10FFFF || is_surrogate) return {};
-  return {code, length};
+  return code;
 }
 
 bool IsControl(uint32_t code) {
@@ -62,11 +39,10 @@ std::string Shown(std::string_view bytes, IsShown is_shown) {
   std::string text;
   text.reserve(bytes.size());
   while (!bytes.empty()) {
-    const Character character = Decode(bytes);
-    const size_t length = std::max<size_t>(character.length, 1);
-    const bool is_kept = character.length > 0 && is_shown(character.code);
-    text += is_kept ? bytes.substr(0, length) : kReplacement;
-    bytes.remove_prefix(length);
+    const size_t length = Utf8CharacterLength(bytes);
+    const std::string_view character = bytes.substr(0, std::max<size_t>(length, 1));
+    text += length > 0 && is_shown(CodeOf(character)) ? character : kReplacement;
+    bytes.remove_prefix(character.size());
   }
   return text;
 }
@@ -84,23 +60,16 @@ std::string ShownText(std::string_view bytes) {
 }
 
 std::string_view WithoutCutCharacter(std::string_view bytes) {
-  size_t tail = 0;
-  while (tail < 3 && tail < bytes.size() && IsContinuation(bytes[bytes.size() - 1 - tail])) ++tail;
-  if (tail == bytes.size()) return bytes;
-  const size_t start = bytes.size() - 1 - tail;
-  const bool is_cut = LengthFrom(static_cast<unsigned char>(bytes[start])) > tail + 1;
-  return is_cut ? bytes.substr(0, start) : bytes;
+  for (size_t tail = 1; tail <= std::min<size_t>(bytes.size(), 3); ++tail) {
+    const std::string_view kept = bytes.substr(0, bytes.size() - tail);
+    if (IsCutUtf8Character(bytes.substr(kept.size()))) return kept;
+  }
+  return bytes;
 }
 
 bool SurvivesForms(std::string_view name) {
-  while (!name.empty()) {
-    const Character character = Decode(name);
-    const bool is_changed =
-        character.code == '\0' || character.code == '\n' || character.code == '\r';
-    if (character.length == 0 || is_changed) return false;
-    name.remove_prefix(character.length);
-  }
-  return true;
+  constexpr std::string_view kChanged("\0\r\n", 3);
+  return Utf8Length(name) == name.size() && name.find_first_of(kChanged) == std::string_view::npos;
 }
 
 }  // namespace web

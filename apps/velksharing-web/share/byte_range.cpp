@@ -1,31 +1,21 @@
 #include "share/byte_range.h"
 
-#include <strings.h>
-
 #include <algorithm>
 #include <limits>
 #include <optional>
+
+#include "http/text.h"
 
 namespace web::share {
 namespace {
 
 constexpr std::string_view kUnit = "bytes=";
-constexpr std::string_view kBlanks = " \t";
 
 // "5-9" is first and last; "5-" has no last, "-5" (the last five bytes) no first.
 struct Spec {
   std::optional<off_t> first;
   std::optional<off_t> last;
 };
-
-std::string_view Trim(std::string_view text) {
-  text.remove_prefix(std::min(text.find_first_not_of(kBlanks), text.size()));
-  return text.substr(0, text.find_last_not_of(kBlanks) + 1);
-}
-
-bool IsDigit(char character) {
-  return character >= '0' && character <= '9';
-}
 
 // A number too large for a file is as good as the largest.
 off_t ToNumber(std::string_view digits) {
@@ -69,13 +59,13 @@ ByteRange Apply(const Spec &spec, off_t size) {
 }
 
 bool HasUnit(std::string_view field) {
-  return field.size() > kUnit.size() && strncasecmp(field.data(), kUnit.data(), kUnit.size()) == 0;
+  return IsSameText(field.substr(0, kUnit.size()), kUnit);
 }
 
 }  // namespace
 
 ByteRange ParseRange(std::string_view field, off_t size) {
-  field = Trim(field);
+  field = Trimmed(field);
   if (!HasUnit(field)) return {};
   field.remove_prefix(kUnit.size());
 
@@ -83,9 +73,7 @@ ByteRange ParseRange(std::string_view field, off_t size) {
   ByteRange range;
   bool is_any_satisfiable = false;
   while (!field.empty()) {
-    const size_t comma = std::min(field.find(','), field.size());
-    const std::string_view text = Trim(field.substr(0, comma));
-    field.remove_prefix(std::min(comma + 1, field.size()));
+    const std::string_view text = Trimmed(TakePart(field, ','));
     if (text.empty()) continue;
     const std::optional<Spec> spec = ParseSpec(text);
     if (!spec) return {};

@@ -1,12 +1,11 @@
 #include "share/conditions.h"
 
-#include <strings.h>
-
 #include <cinttypes>
 #include <cstdio>
 #include <optional>
 #include <string_view>
 
+#include "http/text.h"
 #include "share/http_date.h"
 
 namespace web::share {
@@ -31,7 +30,7 @@ std::string_view TakeTag(std::string_view &list) {
 }
 
 bool IsSameTag(std::string_view given, std::string_view tag, Comparison comparison) {
-  const bool is_weak = given.substr(0, kWeak.size()) == kWeak;
+  const bool is_weak = given.starts_with(kWeak);
   if (is_weak && comparison == Comparison::STRONG) return false;
   return (is_weak ? given.substr(kWeak.size()) : given) == tag;
 }
@@ -43,15 +42,11 @@ bool ListHas(std::string_view list, std::string_view tag, Comparison comparison)
   return false;
 }
 
-bool IsNamed(const std::string &field, std::string_view name) {
-  return field.size() == name.size() && strncasecmp(field.data(), name.data(), name.size()) == 0;
-}
-
 // A list may come in several fields.
 bool AnyMatches(const Fields &request, std::string_view name, std::string_view tag,
                 Comparison comparison) {
   for (const auto &[field, value] : request) {
-    if (!IsNamed(field, name)) continue;
+    if (!IsSameText(field, name)) continue;
     if (value == "*" || ListHas(value, tag, comparison)) return true;
   }
   return false;

@@ -1,8 +1,8 @@
 #include "share/content_disposition.h"
 
 #include "http/percent.h"
+#include "http/utf8.h"
 #include "share/readable.h"
-#include "share/utf8.h"
 
 namespace web::share {
 namespace {

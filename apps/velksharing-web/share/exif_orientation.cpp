@@ -39,7 +39,7 @@ std::string_view FindExif(std::string_view jpeg) {
   constexpr std::string_view kStart("\xFF\xD8", 2);
   constexpr std::string_view kExif("Exif\0\0", 6);
   constexpr uint32_t kExifSegment = 0xFFE1;
-  if (jpeg.substr(0, kStart.size()) != kStart) return {};
+  if (!jpeg.starts_with(kStart)) return {};
   const Numbers numbers(jpeg, true);
   size_t place = kStart.size();
   while (true) {
@@ -48,7 +48,7 @@ std::string_view FindExif(std::string_view jpeg) {
     // Exif stands before the picture, among the segments of applications and comments.
     if (!marker || !length || *marker < 0xFFE0 || *length < 2) return {};
     const std::string_view segment = jpeg.substr(place + 4, *length - 2);
-    if (*marker == kExifSegment && segment.substr(0, kExif.size()) == kExif) {
+    if (*marker == kExifSegment && segment.starts_with(kExif)) {
       return segment.substr(kExif.size());
     }
     place += 2 + *length;
@@ -72,8 +72,8 @@ std::optional<uint32_t> FindOrientation(const Numbers &numbers) {
 
 int ExifOrientation(std::string_view jpeg) {
   const std::string_view exif = FindExif(jpeg);
-  const bool is_big_endian = exif.substr(0, 2) == "MM";
-  if (!is_big_endian && exif.substr(0, 2) != "II") return kUpright;
+  const bool is_big_endian = exif.starts_with("MM");
+  if (!is_big_endian && !exif.starts_with("II")) return kUpright;
   const uint32_t orientation = FindOrientation(Numbers(exif, is_big_endian)).value_or(kUpright);
   return orientation >= 1 && orientation <= 8 ? static_cast<int>(orientation) : kUpright;
 }

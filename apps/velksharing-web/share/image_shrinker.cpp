@@ -24,20 +24,16 @@ using Image = std::unique_ptr<gdImage, ImageCloser>;
 
 void KeepSilent(int, const char *, va_list) {}
 
-bool StartsWith(std::string_view text, std::string_view start) {
-  return text.substr(0, start.size()) == start;
-}
-
 bool IsJpeg(std::string_view bytes) {
-  return StartsWith(bytes, "\xFF\xD8\xFF");
+  return bytes.starts_with("\xFF\xD8\xFF");
 }
 
 bool IsPng(std::string_view bytes) {
-  return StartsWith(bytes, "\x89PNG\r\n");
+  return bytes.starts_with("\x89PNG\r\n");
 }
 
 bool IsGif(std::string_view bytes) {
-  return StartsWith(bytes, "GIF8");
+  return bytes.starts_with("GIF8");
 }
 
 // A number of `width` bytes; 0 when there are not so many.
@@ -72,7 +68,7 @@ Image Open(std::string_view bytes, int side) {
   if (IsJpeg(bytes)) return OpenJpeg(bytes, side);
   if (IsPng(bytes)) return Image(gdImageCreateFromPngPtr(size, data));
   if (IsGif(bytes)) return Image(gdImageCreateFromGifPtr(size, data));
-  if (StartsWith(bytes, "RIFF") && StartsWith(bytes.substr(8), "WEBP")) {
+  if (bytes.starts_with("RIFF") && bytes.size() > 12 && bytes.substr(8, 4) == "WEBP") {
     return Image(gdImageCreateFromWebpPtr(size, data));
   }
   return nullptr;

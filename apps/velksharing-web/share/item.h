@@ -4,6 +4,7 @@
 #include <sys/types.h>
 
 #include <ctime>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -21,6 +22,10 @@ struct Item {
   ino_t inode = 0;
   UniqueFd file;  ///< Not at a known offset: read with pread().
 };
+
+/// The first bytes of a file.
+/// @return at most `limit`, fewer when the file ends before; nothing when it cannot be read.
+std::optional<std::string> ReadStart(const Item &file, size_t limit);
 
 }  // namespace web::share
 

@@ -60,15 +60,6 @@ TypesByEnding ReadDatabase() {
   return types;
 }
 
-bool StartsWith(std::string_view text, std::string_view start) {
-  return text.substr(0, start.size()) == start;
-}
-
-template <size_t Count>
-bool IsIn(const std::array<std::string_view, Count> &list, std::string_view text) {
-  return std::find(list.begin(), list.end(), text) != list.end();
-}
-
 }  // namespace
 
 const std::string &MediaTypeByName(std::string_view name) {
@@ -81,13 +72,13 @@ const std::string &MediaTypeByName(std::string_view name) {
 }
 
 bool IsShownInline(std::string_view media_type) {
-  return StartsWith(media_type, "audio/") || StartsWith(media_type, "video/") ||
-         IsIn(kShownInline, media_type);
+  return media_type.starts_with("audio/") || media_type.starts_with("video/") ||
+         std::ranges::count(kShownInline, media_type) > 0;
 }
 
 bool IsCompressed(std::string_view media_type) {
-  return StartsWith(media_type, "audio/") || StartsWith(media_type, "video/") ||
-         IsIn(kCompressed, media_type);
+  return media_type.starts_with("audio/") || media_type.starts_with("video/") ||
+         std::ranges::count(kCompressed, media_type) > 0;
 }
 
 }  // namespace web::share

@@ -2,12 +2,10 @@
 
 #include <algorithm>
 
+#include "http/text.h"
+
 namespace web::share {
 namespace {
-
-bool IsDigit(char character) {
-  return character >= '0' && character <= '9';
-}
 
 int Rank(char character) {
   const bool is_upper = character >= 'A' && character <= 'Z';

@@ -1,13 +1,10 @@
 #include "share/preview.h"
 
-#include <unistd.h>
-
 #include <algorithm>
 #include <array>
-#include <cerrno>
 
+#include "http/utf8.h"
 #include "share/media_type.h"
-#include "share/utf8.h"
 
 namespace web::share {
 namespace {
@@ -30,29 +27,16 @@ constexpr std::array<std::string_view, 9> kTextsByAnotherName = {
     "application/yaml", "application/x-httpd-php", "message/rfc822",
 };
 
-template <size_t Count>
-bool IsIn(const std::array<std::string_view, Count> &list, std::string_view text) {
-  return std::find(list.begin(), list.end(), text) != list.end();
-}
-
-bool StartsWith(std::string_view text, std::string_view start) {
-  return text.substr(0, start.size()) == start;
-}
-
-bool EndsWith(std::string_view text, std::string_view end) {
-  return text.size() >= end.size() && text.substr(text.size() - end.size()) == end;
-}
-
 bool IsTextType(std::string_view type) {
-  return StartsWith(type, "text/") || EndsWith(type, "+xml") || EndsWith(type, "+json") ||
-         IsIn(kTextsByAnotherName, type);
+  return type.starts_with("text/") || type.ends_with("+xml") || type.ends_with("+json") ||
+         std::ranges::count(kTextsByAnotherName, type) > 0;
 }
 
 PreviewKind PreviewByType(std::string_view type) {
   if (type == "application/pdf") return PreviewKind::PDF;
-  if (IsIn(kImages, type)) return PreviewKind::IMAGE;
-  if (StartsWith(type, "audio/")) return PreviewKind::AUDIO;
-  if (StartsWith(type, "video/")) return PreviewKind::VIDEO;
+  if (std::ranges::count(kImages, type) > 0) return PreviewKind::IMAGE;
+  if (type.starts_with("audio/")) return PreviewKind::AUDIO;
+  if (type.starts_with("video/")) return PreviewKind::VIDEO;
   return IsTextType(type) ? PreviewKind::TEXT : PreviewKind::OTHER;
 }
 
@@ -61,21 +45,6 @@ bool IsControl(char byte) {
   constexpr std::string_view kAllowed = "\t\n\r\f\b\x1B";
   const auto code = static_cast<unsigned char>(byte);
   return (code < 0x20 || code == 0x7F) && kAllowed.find(byte) == std::string_view::npos;
-}
-
-std::optional<std::string> ReadStart(const Item &file, size_t limit) {
-  std::string start(limit, '\0');
-  size_t filled = 0;
-  while (filled < limit) {
-    const ssize_t count =
-        pread(file.file.get(), start.data() + filled, limit - filled, static_cast<off_t>(filled));
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) return std::nullopt;
-    if (count == 0) break;
-    filled += static_cast<size_t>(count);
-  }
-  start.resize(filled);
-  return start;
 }
 
 }  // namespace
@@ -107,7 +76,8 @@ std::optional<TextStart> ReadText(const Item &file, size_t limit) {
 }
 
 bool MayHaveThumbnail(std::string_view name, off_t size) {
-  return size > 0 && size <= kLargestImage && IsIn(kImagesToShrink, MediaTypeByName(name));
+  return size > 0 && size <= kLargestImage &&
+         std::ranges::count(kImagesToShrink, MediaTypeByName(name)) > 0;
 }
 
 }  // namespace web::share

@@ -1,6 +1,6 @@
 #include "share/readable.h"
 
-#include "share/utf8.h"
+#include "http/utf8.h"
 
 namespace web::share {
 namespace {

@@ -1,9 +1,5 @@
 #include "share/thumbnail.h"
 
-#include <unistd.h>
-
-#include <algorithm>
-#include <cerrno>
 #include <utility>
 
 #include "share/conditions.h"
@@ -16,19 +12,6 @@ namespace {
 
 // Enough for some 70 million pixels, and for a JPEG of any camera.
 constexpr SealedLimits kLimits = {320 * 1024 * 1024, 4, 1024 * 1024};
-
-std::optional<std::string> ReadWhole(const Item &file) {
-  std::string content(static_cast<size_t>(file.size), '\0');
-  size_t filled = 0;
-  while (filled < content.size()) {
-    const ssize_t count = pread(file.file.get(), content.data() + filled, content.size() - filled,
-                                static_cast<off_t>(filled));
-    if (count < 0 && errno == EINTR) continue;
-    if (count <= 0) return std::nullopt;
-    filled += static_cast<size_t>(count);
-  }
-  return content;
-}
 
 const char *TypeOf(const std::string &thumbnail) {
   return thumbnail.compare(0, 1, "\x89") == 0 ? "image/png" : "image/jpeg";
@@ -45,7 +28,7 @@ Validators ThumbnailValidators(const Item &image) {
 
 std::optional<std::string> MakeThumbnail(const Item &image) {
   if (image.is_folder || !MayHaveThumbnail(image.name, image.size)) return std::nullopt;
-  const std::optional<std::string> content = ReadWhole(image);
+  const std::optional<std::string> content = ReadStart(image, static_cast<size_t>(image.size));
   if (!content) return std::nullopt;
   return RunSealed(kLimits, [&] { return ShrinkImage(*content, kThumbnailSide); });
 }

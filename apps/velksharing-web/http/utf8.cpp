@@ -1,8 +1,8 @@
-#include "share/utf8.h"
+#include "http/utf8.h"
 
 #include <cstdint>
 
-namespace web::share {
+namespace web {
 namespace {
 
 constexpr size_t kLongest = 4;
@@ -69,4 +69,4 @@ bool IsCutUtf8Character(std::string_view rest) {
   return rest.size() < length && PlausibleBytes(rest, length) == rest.size();
 }
 
-}  // namespace web::share
+}  // namespace web
