@@ -17,7 +17,7 @@ class EmbeddedServerPrivate;
 class EmbeddedServer {
  public:
   /// Begins to serve.
-  /// @param listening_socket shared with other processes; must live as long as the server.
+  /// @param listening_socket shared with other processes; must be open until StopAccepting().
   /// @param service must outlive the server.
   /// @throws std::runtime_error.
   EmbeddedServer(int listening_socket, const Settings &settings, Service &service);
@@ -26,7 +26,7 @@ class EmbeddedServer {
   /// Cuts the connections that are left, and waits for their threads.
   ~EmbeddedServer();
 
-  /// Takes no more connections; the other processes go on.
+  /// Takes no more connections, and does not use the listening socket any more.
   void StopAccepting();
 
  private:

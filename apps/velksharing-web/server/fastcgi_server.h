@@ -16,8 +16,8 @@ class FastCgiServerPrivate;
 class FastCgiServer {
  public:
   /// Begins to serve.
-  /// @param listening_socket does not block, and is shared with other processes; must live as long
-  ///        as the server.
+  /// @param listening_socket does not block, and is shared with other processes; must be open
+  ///        until StopAccepting().
   /// @param service must outlive the server.
   /// @throws std::runtime_error.
   FastCgiServer(int listening_socket, const Settings &settings, Service &service);
@@ -26,7 +26,7 @@ class FastCgiServer {
   /// Cuts the connections that are left, and waits for the threads.
   ~FastCgiServer();
 
-  /// Takes no more requests; the other processes go on.
+  /// Takes no more requests; the listening socket may be closed.
   void StopAccepting();
 
  private:

@@ -54,14 +54,15 @@ UniqueFd OpenSocket(const Settings &settings, Mode mode) {
 
 /// Serves until told to stop, then finishes what runs.
 template <typename Server>
-int Work(int listening_socket, const Settings &settings, const std::string &form_secret,
+int Work(UniqueFd &socket, const Settings &settings, const std::string &form_secret,
          WorkerSignals &signals) {
   Service service(settings, form_secret);
   service.Load();
-  Server server(listening_socket, settings, service);
+  Server server(socket.get(), settings, service);
   while (signals.Wait() == WorkerSignals::Kind::RELOAD) service.Load();
   service.BeginStop();
   server.StopAccepting();
+  socket.Reset();
   service.WaitUntilIdle(std::chrono::seconds(settings.stop_timeout));
   return service.ExitStatus();
 }
@@ -70,18 +71,18 @@ int Serve(const Options &options) {
   const Settings &settings = options.settings;
   PrepareSignals();
   RaiseDescriptorLimit();
-  const UniqueFd socket = OpenSocket(settings, options.mode);
+  UniqueFd socket = OpenSocket(settings, options.mode);
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
   const std::string secret = FormSecret(settings.runtime_folder);
-  syslog(LOG_INFO, "%s on %s", options.mode == Mode::FASTCGI ? "FastCGI" : "HTTP",
-         AddressOf(socket.get()).c_str());
+  const bool is_fastcgi = options.mode == Mode::FASTCGI;
+  syslog(LOG_INFO, "%s on %s", is_fastcgi ? "FastCGI" : "HTTP", AddressOf(socket.get()).c_str());
+  const auto work = is_fastcgi ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
   return Supervise(
-      settings.workers, std::chrono::seconds(settings.stop_timeout), [&](WorkerSignals &signals) {
-        const auto work =
-            options.mode == Mode::FASTCGI ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
-        return work(socket.get(), settings, secret, signals);
-      });
+      settings.workers, std::chrono::seconds(settings.stop_timeout),
+      [&](WorkerSignals &signals) { return work(socket, settings, secret, signals); },
+      // New visitors are turned away at once, and not left waiting for nobody.
+      [&] { socket.Reset(); });
 }
 
 /// The command line is left alone: some web servers put words of the address there.

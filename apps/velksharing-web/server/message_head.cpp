@@ -71,6 +71,34 @@ HeadVerdict JudgeLength(const Fields &fields) {
 
 }  // namespace
 
+bool IsAccountedFor(std::string_view head, std::string_view version,
+                    const std::vector<RawField> &fields) {
+  constexpr std::string_view kLineEnd("\0\0", 2);
+  constexpr std::string_view kColon("\0", 1);
+  constexpr std::string_view kBlanks = " \t";
+  const char *const end = head.data() + head.size();
+  const char *at = version.data() + version.size();
+  const auto pass = [&](std::string_view expected) {
+    const auto left = static_cast<size_t>(end - at);
+    if (!std::string_view(at, left).starts_with(expected)) return false;
+    at += expected.size();
+    return true;
+  };
+  const auto pass_blanks = [&] {
+    while (at < end && kBlanks.find(*at) != std::string_view::npos) ++at;
+  };
+  for (const auto &[name, value] : fields) {
+    if (!pass(kLineEnd) || at != name.data()) return false;
+    at += name.size();
+    if (!pass(kColon)) return false;
+    pass_blanks();
+    if (at != value.data()) return false;
+    at += value.size();
+    pass_blanks();
+  }
+  return pass(kLineEnd) && pass(kLineEnd) && at == end;
+}
+
 HeadVerdict JudgeHead(Request &request, std::string_view version) {
   const Fields sent = std::move(request.headers);
   request.headers = ForHandler(sent);

@@ -53,7 +53,8 @@ struct Slot {
 
 class Supervisor {
  public:
-  Supervisor(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work);
+  Supervisor(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work,
+             const std::function<void()> &stopping);
 
   int Run();
 
@@ -71,6 +72,7 @@ class Supervisor {
   std::vector<Slot> slots_;
   const seconds stop_timeout_;
   const std::function<int(WorkerSignals &)> &work_;
+  const std::function<void()> &stopping_;
   UniqueFd lifeline_;  ///< What workers hold.
   UniqueFd hold_;      ///< Closes when this process ends, however it does.
   bool is_stopping_ = false;
@@ -87,8 +89,12 @@ int NextSignal(Clock::time_point until) {
 }
 
 Supervisor::Supervisor(int workers, seconds stop_timeout,
-                       const std::function<int(WorkerSignals &)> &work)
-    : slots_(static_cast<size_t>(workers)), stop_timeout_(stop_timeout), work_(work) {
+                       const std::function<int(WorkerSignals &)> &work,
+                       const std::function<void()> &stopping)
+    : slots_(static_cast<size_t>(workers)),
+      stop_timeout_(stop_timeout),
+      work_(work),
+      stopping_(stopping) {
   int ends[2] = {};
   if (pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe for the workers");
   lifeline_.Reset(ends[0]);
@@ -165,6 +171,7 @@ void Supervisor::Vacate(Slot &slot, int status) {
 
 void Supervisor::Stop() {
   is_stopping_ = true;
+  stopping_();
   Forward(SIGTERM);
   const Clock::time_point end = Clock::now() + stop_timeout_ + kBeyondTimeout;
   while (Reap(), IsAnyoneThere()) {
@@ -215,8 +222,9 @@ WorkerSignals::Kind WorkerSignals::Wait() {
   return signal.ssi_signo == SIGHUP ? Kind::RELOAD : Kind::STOP;
 }
 
-int Supervise(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work) {
-  return Supervisor(workers, stop_timeout, work).Run();
+int Supervise(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work,
+              const std::function<void()> &stopping) {
+  return Supervisor(workers, stop_timeout, work, stopping).Run();
 }
 
 void PrepareSignals() {

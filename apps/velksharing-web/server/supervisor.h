@@ -35,9 +35,11 @@ class WorkerSignals {
 ///
 /// To be called while the process has one thread.
 /// @param work what a worker does; its result is the worker's exit status.
+/// @param stopping called in the supervisor when it begins to stop.
 /// @return the supervisor's exit status.
 int Supervise(int workers, std::chrono::seconds stop_timeout,
-              const std::function<int(WorkerSignals &)> &work);
+              const std::function<int(WorkerSignals &)> &work,
+              const std::function<void()> &stopping);
 
 /// Blocks the signals that supervisor and workers wait for, and ignores SIGPIPE. For the first
 /// thread, before there are others.

@@ -2,12 +2,18 @@
 
 #include <strings.h>
 
+#include <algorithm>
+
 namespace web {
 namespace {
 
 bool BeginsWithIgnoringCase(std::string_view text, std::string_view beginning) {
   return text.size() >= beginning.size() &&
          strncasecmp(text.data(), beginning.data(), beginning.size()) == 0;
+}
+
+bool IsBlankOrControl(char byte) {
+  return static_cast<unsigned char>(byte) <= ' ' || byte == '\x7f';
 }
 
 /// Without scheme and host; "" where there is no path behind them.
@@ -25,6 +31,7 @@ std::string_view WithoutHost(std::string_view target) {
 bool SetTarget(std::string_view target, Request &request) {
   target = WithoutHost(target);
   if (target.empty() || target.front() != '/') return false;
+  if (std::any_of(target.begin(), target.end(), IsBlankOrControl)) return false;
   const size_t mark = target.find('?');
   request.path = target.substr(0, mark);
   request.query = mark == std::string_view::npos ? "" : target.substr(mark + 1);
