@@ -1,8 +1,8 @@
 #include "pages/language_choice.h"
 
 #include <algorithm>
-#include <optional>
 
+#include "http/quality.h"
 #include "http/text.h"
 
 namespace web {
@@ -14,39 +14,12 @@ struct Wish {
   int quality = 1000;
 };
 
-/// "0.85" as 850. Nothing for what is no number from 0 to 1 with at most three decimals.
-std::optional<int> Quality(std::string_view text) {
-  if (text.empty() || text.size() > 5 || (text[0] != '0' && text[0] != '1')) return {};
-  if (text.size() > 1 && text[1] != '.') return {};
-  int quality = (text[0] - '0') * 1000;
-  int worth = 100;
-  for (const char digit : text.substr(std::min<size_t>(2, text.size()))) {
-    if (!IsDigit(digit)) return {};
-    quality += (digit - '0') * worth;
-    worth /= 10;
-  }
-  if (quality > 1000) return {};
-  return quality;
-}
-
-std::optional<Wish> ReadWish(std::string_view text) {
-  Wish wish{Trimmed(TakePart(text, ';'))};
-  if (wish.tag.empty()) return {};
-  while (!text.empty()) {
-    std::string_view parameter = TakePart(text, ';');
-    const std::string_view name = Trimmed(TakePart(parameter, '='));
-    if (!IsSameText(name, "q")) continue;
-    const std::optional<int> quality = Quality(Trimmed(parameter));
-    if (!quality) return {};
-    wish.quality = *quality;
-  }
-  return wish;
-}
-
 std::vector<Wish> ReadWishes(std::string_view field) {
   std::vector<Wish> wishes;
   while (!field.empty()) {
-    if (const std::optional<Wish> wish = ReadWish(TakePart(field, ','))) wishes.push_back(*wish);
+    std::string_view wish = TakePart(field, ',');
+    const std::string_view tag = Trimmed(TakePart(wish, ';'));
+    if (!tag.empty()) wishes.push_back({tag, QualityOf(wish)});
   }
   return wishes;
 }
