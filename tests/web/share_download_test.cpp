@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <ctime>
+#include <ostream>
 #include <string>
 #include <variant>
 
@@ -156,6 +157,10 @@ struct ConditionCase {
   int status;
 };
 
+void PrintTo(const ConditionCase &test_case, std::ostream *out) {
+  *out << test_case.field << ": " << test_case.value;
+}
+
 class ShareDownloadCondition : public ShareDownload,
                                public testing::WithParamInterface<ConditionCase> {};
 
@@ -219,6 +224,10 @@ struct RangeCase {
   std::string content_range;
   std::string body;
 };
+
+void PrintTo(const RangeCase &test_case, std::ostream *out) {
+  *out << test_case.range;
+}
 
 class ShareDownloadRange : public ShareDownload, public testing::WithParamInterface<RangeCase> {};
 
@@ -331,6 +340,10 @@ struct TypeCase {
   bool is_inline;
 };
 
+void PrintTo(const TypeCase &test_case, std::ostream *out) {
+  *out << test_case.name;
+}
+
 class ShareDownloadType : public testing::TestWithParam<TypeCase> {
  protected:
   Response Get(Purpose purpose) const {
@@ -411,6 +424,10 @@ struct DispositionCase {
   std::string name;
   std::string value;
 };
+
+void PrintTo(const DispositionCase &test_case, std::ostream *out) {
+  *out << test_case.value;
+}
 
 class ShareDisposition : public testing::TestWithParam<DispositionCase> {};
 

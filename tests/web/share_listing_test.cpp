@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -229,6 +230,10 @@ struct NaturalCase {
   std::string smaller;
   std::string larger;
 };
+
+void PrintTo(const NaturalCase &test_case, std::ostream *out) {
+  *out << test_case.smaller << " before " << test_case.larger;
+}
 
 class NaturalOrder : public testing::TestWithParam<NaturalCase> {};
 

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <ostream>
 #include <string>
 
 #include "share_support.h"
@@ -25,6 +26,10 @@ struct NameCase {
   std::string name;
   PreviewKind kind;
 };
+
+void PrintTo(const NameCase &test_case, std::ostream *out) {
+  *out << test_case.name;
+}
 
 class SharePreviewByName : public testing::TestWithParam<NameCase> {};
 

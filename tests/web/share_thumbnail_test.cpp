@@ -10,6 +10,7 @@
 #include <csignal>
 #include <cstdint>
 #include <memory>
+#include <ostream>
 #include <string>
 #include <utility>
 #include <variant>
@@ -103,6 +104,10 @@ struct FormatCase {
   std::string name;
   Encoder encoder;
 };
+
+void PrintTo(const FormatCase &test_case, std::ostream *out) {
+  *out << test_case.name;
+}
 
 class ShareThumbnailFormat : public testing::TestWithParam<FormatCase> {};
 
@@ -202,6 +207,10 @@ struct OrientationCase {
   std::string quarters;
   bool is_swapped;
 };
+
+void PrintTo(const OrientationCase &test_case, std::ostream *out) {
+  *out << test_case.orientation;
+}
 
 class ShareThumbnailOrientation : public testing::TestWithParam<OrientationCase> {};
 

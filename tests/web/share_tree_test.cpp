@@ -89,8 +89,12 @@ INSTANTIATE_TEST_SUITE_P(ShareTree, UnusablePath,
                                          "/dev/zero", "/proc", "/proc/self/maps",
                                          "/proc/self/environ", "/proc/self/root/etc/passwd",
                                          "/proc/self/fd/0", "/dev/fd/0", "/dev/stdin",
-                                         "/etc/passwd/", std::string(10'000, '/') + "x",
-                                         "/" + std::string(300, 'a')));
+                                         "/etc/passwd/", "/tmp/" + std::string(256, 'a')));
+
+TEST(ShareTree, APathTooLongForTheSystemIsNotFound) {
+  const LogCapture log;
+  EXPECT_FALSE(SharedTree::Open(std::string(10'000, '/') + "etc/passwd", Sharer()));
+}
 
 TEST(ShareTree, AnOwnerWhoIsGoneSharesNothing) {
   const SharedFolder folder;
