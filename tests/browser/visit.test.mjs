@@ -300,6 +300,19 @@ describe("a link for accounts", () => {
 
 describe("an open link", () => {
   visit(
+    "shows a large folder page by page",
+    async (page) => {
+      await page.goto(world.share("--path", world.makeManyFiles(501), "--title", "Many"));
+      assert.equal(await page.locator("td.name").count(), 500);
+      await page.getByRole("link", { name: "Next page" }).click();
+      assert.deepEqual(await page.locator("td.name bdi").allInnerTexts(), ["501.txt"]);
+      await page.getByRole("link", { name: "Previous page" }).click();
+      assert.equal(await page.locator("td.name").count(), 500);
+    },
+    withoutScript,
+  );
+
+  visit(
     "is open at once",
     async (page) => {
       await page.goto(world.share("--path", world.shared, "--title", "Open"));

@@ -305,6 +305,38 @@ TEST(FolderPage, LeadsBackUpTheWay) {
   EXPECT_THAT(page, HasSubstr("<span aria-current=\"page\"><bdi>c</bdi></span>"));
 }
 
+TEST(FolderPage, IsDividedWhenThereIsMuchToShow) {
+  FolderView view = Folder({});
+  for (size_t i = 0; i < Pages::kEntriesPerPage * 2 + 1; ++i) {
+    view.entries.push_back(Named("file" + std::to_string(i) + "."));
+  }
+  view.sort = SortBy::kDate;
+  view.page = 2;
+  const std::string middle = Pages({}).Folder(kEnglish, view);
+  EXPECT_EQ(Pages::kEntriesPerPage, CountOf(middle, "<td class=\"name\""));
+  EXPECT_THAT(middle, Not(HasSubstr("file499.")));
+  EXPECT_THAT(middle, HasSubstr("file500."));
+  EXPECT_THAT(middle, HasSubstr("Page 2 of 3"));
+  EXPECT_THAT(middle, HasSubstr("1,001 items"));
+  const std::string folder = "href=\"/sharing/aB3xK9pQ2/sub%20folder/?sort=date&amp;order=asc&amp;";
+  EXPECT_THAT(middle, HasSubstr(folder + "page=1\""));
+  EXPECT_THAT(middle, HasSubstr(folder + "page=3\""));
+  view.page = 1;
+  EXPECT_EQ(1u, CountOf(Pages({}).Folder(kEnglish, view), "&amp;page="));
+  view.page = SIZE_MAX;
+  const std::string last = Pages({}).Folder(kEnglish, view);
+  EXPECT_EQ(1u, CountOf(last, "<td class=\"name\""));
+  EXPECT_THAT(last, HasSubstr("Page 3 of 3"));
+  view.page = 0;
+  EXPECT_THAT(Pages({}).Folder(kEnglish, view), HasSubstr("Page 1 of 3"));
+}
+
+TEST(FolderPage, IsNotDividedWhenItFitsOnOnePage) {
+  FolderView view = Folder({});
+  view.entries.assign(Pages::kEntriesPerPage, Named("a"));
+  EXPECT_THAT(Pages({}).Folder(kEnglish, view), Not(HasSubstr("page=")));
+}
+
 TEST(FolderPage, SaysThatItIsEmpty) {
   const std::string page = Pages({}).Folder(kEnglish, Folder({}));
   EXPECT_THAT(page, HasSubstr("There is nothing in this folder."));

@@ -88,6 +88,10 @@ class Writer {
     looking.is_incomplete = true;
     looking.link.continue_to = "https://www.example.org/albums";
     Write("folder-looking", pages_.Folder(reader_, looking));
+    web::FolderView last = Documents();
+    last.entries.resize(web::Pages::kEntriesPerPage + 3, last.entries.back());
+    last.page = 2;
+    Write("folder-second-page", pages_.Folder(reader_, last));
     Write("file-text", pages_.File(reader_, TextFile()));
     Write("file-binary", pages_.File(reader_, BinaryFile()));
     Write("logged-out", pages_.LoggedOut(reader_, link));

@@ -4,6 +4,7 @@
 
 #include "http/percent.h"
 #include "pages/page_data.h"
+#include "pages/pages.h"
 #include "pages/shown_text.h"
 
 namespace web {
@@ -18,6 +19,16 @@ struct Column {
 constexpr Column kColumns[] = {
     {SortBy::kName, "name", false}, {SortBy::kSize, "size", true}, {SortBy::kDate, "date", true}};
 
+const char *ColumnName(SortBy sort) {
+  const auto *column = std::find_if(std::begin(kColumns), std::end(kColumns),
+                                    [sort](const Column &known) { return known.sort == sort; });
+  return column->name;
+}
+
+std::string OrderQuery(const std::string &column, bool is_descending) {
+  return "?sort=" + column + "&order=" + (is_descending ? "desc" : "asc");
+}
+
 Data ColumnData(const Column &column, const FolderView &view, const std::string &folder,
                 const Catalogue &texts) {
   const bool is_current = view.sort == column.sort;
@@ -26,7 +37,7 @@ Data ColumnData(const Column &column, const FolderView &view, const std::string 
   Data data;
   data.set("class", name);
   data.set("label", texts.Text("column_" + name));
-  data.set("href", folder + "?sort=" + name + "&order=" + (is_next_descending ? "desc" : "asc"));
+  data.set("href", folder + OrderQuery(name, is_next_descending));
   const char *direction = view.is_descending ? "descending" : "ascending";
   SetOrFalse(data, "direction", is_current ? direction : "");
   return data;
@@ -65,16 +76,38 @@ std::string Summary(const FolderView &view, const Catalogue &texts) {
   return summary;
 }
 
-/// Sets both lists of the folder: all of it, and the images among it.
-void SetEntries(Data &data, const FolderView &view, const std::string &folder,
+/// Which part of a folder a page shows.
+struct Part {
+  size_t page = 1;
+  size_t pages = 1;
+  std::vector<FolderEntry>::const_iterator begin;
+  std::vector<FolderEntry>::const_iterator end;
+};
+
+Part PartOf(const FolderView &view) {
+  constexpr size_t kSize = Pages::kEntriesPerPage;
+  const size_t count = view.entries.size();
+  Part part;
+  part.pages = std::max<size_t>(1, (count + kSize - 1) / kSize);
+  part.page = std::clamp<size_t>(view.page, 1, part.pages);
+  const auto at = [&](size_t page) {
+    return view.entries.begin() + static_cast<long>(std::min(page * kSize, count));
+  };
+  part.begin = at(part.page - 1);
+  part.end = at(part.page);
+  return part;
+}
+
+/// Sets both lists of a page: all of its entries, and the images among them.
+void SetEntries(Data &data, const FolderView &view, const Part &part, const std::string &folder,
                 const Catalogue &texts) {
   Data entries(Data::type::list);
   Data images(Data::type::list);
   size_t image_count = 0;
-  for (const FolderEntry &entry : view.entries) {
-    const Data line = EntryData(entry, view, folder, texts);
+  for (auto entry = part.begin; entry != part.end; ++entry) {
+    const Data line = EntryData(*entry, view, folder, texts);
     entries.push_back(line);
-    if (!entry.has_thumbnail) continue;
+    if (!entry->has_thumbnail) continue;
     images.push_back(line);
     ++image_count;
   }
@@ -84,6 +117,21 @@ void SetEntries(Data &data, const FolderView &view, const std::string &folder,
   data.set("images", images);
   SetFlag(data, "has_images", image_count > 0);
   data.set("images_heading", texts.Count("images", image_count));
+}
+
+/// Sets the ways to the pages before and behind.
+void SetTurning(Data &data, const FolderView &view, const Part &part, const std::string &folder,
+                const Catalogue &texts) {
+  const auto page = [&](size_t number) {
+    if (number < 1 || number > part.pages) return std::string();
+    return folder + OrderQuery(ColumnName(view.sort), view.is_descending) +
+           "&page=" + std::to_string(number);
+  };
+  SetFlag(data, "has_pages", part.pages > 1);
+  SetOrFalse(data, "previous_page", page(part.page - 1));
+  SetOrFalse(data, "next_page", page(part.page + 1));
+  data.set("page_of", texts.Text("page_of", {{"page", texts.Number(part.page)},
+                                             {"pages", texts.Number(part.pages)}}));
 }
 
 }  // namespace
@@ -109,7 +157,9 @@ Data FolderData(const FolderView &view, const PageTools &tools) {
     columns.push_back(ColumnData(column, view, address, texts));
   }
   data.set("columns", columns);
-  SetEntries(data, view, above_entries, texts);
+  const Part part = PartOf(view);
+  SetEntries(data, view, part, above_entries, texts);
+  SetTurning(data, view, part, address, texts);
   return data;
 }
 

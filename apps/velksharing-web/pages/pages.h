@@ -47,7 +47,7 @@ struct Asset {
 ///
 ///     POST HASH                login; fields as in PagesSettings, and csrf
 ///     POST HASH/logout         csrf
-///     GET  HASH[/sub/folder/]  ?sort=name|size|date&order=asc|desc
+///     GET  HASH[/sub/folder/]  ?sort=name|size|date&order=asc|desc&page=N
 ///                              ?zip       the whole folder
 ///                              ?zip=&name=A&name=B   what is ticked (a form sends "zip=")
 ///     GET  HASH[/sub/file]     ?download ?view ?thumbnail
@@ -69,6 +69,9 @@ class Pages {
 
   /// How much of a text file its preview shows, at most.
   static constexpr size_t kTextPreviewBytes = 256 * 1024;
+
+  /// How many entries of a folder one page shows.
+  static constexpr size_t kEntriesPerPage = 500;
 
   /// The pages as they are built in; Reload() brings the site's own.
   explicit Pages(PagesSettings settings);

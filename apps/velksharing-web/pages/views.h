@@ -1,6 +1,7 @@
 #ifndef VELKSHARING_WEB_PAGES_VIEWS_H
 #define VELKSHARING_WEB_PAGES_VIEWS_H
 
+#include <cstddef>
 #include <cstdint>
 #include <ctime>
 #include <optional>
@@ -62,13 +63,14 @@ struct FolderEntry {
 
 enum class SortBy { kName, kSize, kDate };
 
-/// A folder. Its own address ends with a slash, but for the shared folder itself.
+/// A folder, all of it. Its own address ends with a slash, but for the shared folder itself.
 struct FolderView {
   LinkView link{};
   std::vector<std::string> path{};     ///< Components below the shared folder; empty for itself.
   std::vector<FolderEntry> entries{};  ///< In the order to be shown: sorted by the caller.
   SortBy sort = SortBy::kName;         ///< The order that they have, for the column heads.
   bool is_descending = false;
+  size_t page = 1;             ///< Which Pages::kEntriesPerPage of them to show; beyond: the last.
   bool is_incomplete = false;  ///< Whether there were too many to show them all.
   bool can_download = true;    ///< false: no downloads, no selection, no ZIP.
 };

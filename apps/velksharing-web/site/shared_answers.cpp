@@ -2,6 +2,7 @@
 
 #include <velksharing/access.h>
 
+#include <charconv>
 #include <optional>
 #include <utility>
 
@@ -24,6 +25,14 @@ share::Order OrderOf(const Form &query) {
   const std::string *direction = query.Find("order");
   order.is_descending = direction != nullptr && *direction == "desc";
   return order;
+}
+
+/// 1 for what is no number.
+size_t PageOf(const Form &query) {
+  const std::string *number = query.Find("page");
+  size_t page = 1;
+  if (number != nullptr) std::from_chars(number->data(), number->data() + number->size(), page);
+  return page;
 }
 
 SortBy ShownOrder(share::SortBy by) {
@@ -111,6 +120,7 @@ Response SharedAnswers::FolderPage(const SharedRequest &wanted, const share::Ite
   for (const share::Entry &entry : listing->entries) view.entries.push_back(LineOf(entry));
   view.sort = ShownOrder(order.by);
   view.is_descending = order.is_descending;
+  view.page = PageOf(wanted.query);
   view.is_incomplete = listing->left_out > 0;
   view.can_download = view_.can_download;
   return answers_.Page(200, pages_.Folder(view_.reader, view));

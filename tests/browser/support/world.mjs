@@ -55,6 +55,14 @@ export class World {
     );
   }
 
+  // A folder of many empty files, to be shared.
+  makeManyFiles(count) {
+    const folder = join(this.#folder, "many");
+    mkdirSync(folder);
+    for (let i = 1; i <= count; ++i) writeFileSync(join(folder, `${i}.txt`), "");
+    return folder;
+  }
+
   address(path) {
     return this.#origin + path;
   }
