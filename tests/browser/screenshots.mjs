@@ -44,8 +44,12 @@ async function take(name, address, fields, options, path = "") {
   const page = await newPage(browser, options);
   await page.goto(address);
   for (const [label, text] of fields) await page.getByLabel(label).fill(text);
-  if (fields.length > 0) await page.keyboard.press("Enter");
-  if (fields.length > 0) await page.waitForLoadState("networkidle");
+  if (fields.length > 0) {
+    await Promise.all([
+      page.waitForNavigation({ waitUntil: "networkidle" }),
+      page.keyboard.press("Enter"),
+    ]);
+  }
   if (path) await page.goto(address + path, { waitUntil: "networkidle" });
   await page.screenshot({ path: `${folder}/${name}.png` });
   await page.context().close();

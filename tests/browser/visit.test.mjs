@@ -34,10 +34,16 @@ function visit(name, walk, options = {}) {
 const withoutScript = { javaScriptEnabled: false };
 const heading = (page) => page.locator("h1").innerText();
 
+// Clicks, and waits for the page that the click leads to.
+async function follow(control) {
+  const [answer] = await Promise.all([control.page().waitForNavigation(), control.click()]);
+  return answer;
+}
+
 async function enter(page, address) {
   await page.goto(address);
   await page.getByLabel("Password").fill(passwords.link);
-  await page.getByRole("button", { name: "Open" }).click();
+  await follow(page.getByRole("button", { name: "Open" }));
 }
 
 async function downloadBy(page, control) {
@@ -67,10 +73,7 @@ describe("a link with a password", () => {
       await page.goto(address);
       assert.equal(await heading(page), "Our holiday on the coast");
       await page.getByLabel("Password").fill("open barley");
-      const [answer] = await Promise.all([
-        page.waitForNavigation(),
-        page.getByRole("button", { name: "Open" }).click(),
-      ]);
+      const answer = await follow(page.getByRole("button", { name: "Open" }));
       assert.equal(answer.status(), 401);
       assert.match(await page.getByRole("alert").innerText(), /did not work/);
       assert.equal(await page.getByLabel("Password").inputValue(), "");
@@ -104,9 +107,9 @@ describe("a link with a password", () => {
         assert.ok(names.some((found) => found.endsWith(name)), `${name} in ${names}`);
       }
 
-      await page.getByRole("button", { name: "Log out" }).click();
+      await follow(page.getByRole("button", { name: "Log out" }));
       assert.equal(await heading(page), "You have logged out");
-      await page.getByRole("link", { name: "Open the link again" }).click();
+      await follow(page.getByRole("link", { name: "Open the link again" }));
       assert.equal(await page.getByLabel("Password").count(), 1);
       const picturePage = await page.goto(`${address}/Beach.png?view`);
       assert.match(picturePage.headers()["content-type"], /text\/html/);
@@ -133,7 +136,7 @@ describe("a link with a password", () => {
   visit("shows what is in the files", async (page) => {
     await enter(page, address);
     const row = page.getByRole("row", { name: "Beach.png" });
-    await row.getByRole("link", { name: "Beach.png", exact: true }).click();
+    await follow(row.getByRole("link", { name: "Beach.png", exact: true }));
     const image = page.getByRole("img", { name: "Preview of Beach.png" });
     await image.evaluate((element) => element.decode());
     assert.equal(await image.evaluate((element) => element.naturalWidth), 800);
@@ -150,14 +153,14 @@ describe("a link with a password", () => {
 
   visit("leads down into folders and back up", async (page) => {
     await enter(page, address);
-    await page.getByRole("link", { name: "letters (Folder)" }).click();
+    await follow(page.getByRole("link", { name: "letters (Folder)" }));
     assert.equal(await heading(page), "letters");
-    await page.getByRole("link", { name: "To all.txt", exact: true }).click();
+    await follow(page.getByRole("link", { name: "To all.txt", exact: true }));
     assert.equal(await heading(page), "To all.txt");
     const way = page.getByRole("navigation", { name: "Where you are" });
-    await way.getByRole("link", { name: "letters" }).click();
+    await follow(way.getByRole("link", { name: "letters" }));
     assert.equal(await heading(page), "letters");
-    await way.getByRole("link", { name: "Our holiday on the coast" }).click();
+    await follow(way.getByRole("link", { name: "Our holiday on the coast" }));
     assert.equal(page.url(), address);
   });
 
@@ -168,11 +171,11 @@ describe("a link with a password", () => {
     const [folder, ...files] = await names();
     assert.equal(await column("Name").getAttribute("aria-sort"), "ascending");
 
-    await column("Name").getByRole("link").click();
+    await follow(column("Name").getByRole("link"));
     assert.equal(await column("Name").getAttribute("aria-sort"), "descending");
     assert.deepEqual(await names(), [folder, ...files.reverse()]);
 
-    await column("Size").getByRole("link").click();
+    await follow(column("Size").getByRole("link"));
     assert.equal(await column("Size").getAttribute("aria-sort"), "descending");
     assert.equal(await column("Name").getAttribute("aria-sort"), null);
     assert.equal((await names()).at(-1), "read me.txt");
@@ -183,8 +186,8 @@ describe("a link with a password", () => {
     async (page) => {
       await page.goto(address);
       await page.keyboard.type(passwords.link);
-      await page.keyboard.press("Enter");
-      await page.waitForSelector("table");
+      await Promise.all([page.waitForNavigation(), page.keyboard.press("Enter")]);
+      assert.equal(await page.getByRole("table").count(), 1);
       await page.keyboard.press("Tab");
       const skip = page.getByRole("link", { name: "Skip to content" });
       assert.ok(await skip.evaluate((element) => element === document.activeElement));
@@ -204,7 +207,7 @@ describe("a link with a password", () => {
       await page.goto(address);
       assert.equal(await page.locator("html").getAttribute("lang"), "de");
       await page.getByLabel("Passwort").fill(passwords.link);
-      await page.getByRole("button", { name: "Öffnen" }).click();
+      await follow(page.getByRole("button", { name: "Öffnen" }));
       const row = page.getByRole("row", { name: "Tickets.pdf" });
       assert.equal(await row.locator("time").innerText(), "02.08.2026, 16:20");
     },
@@ -274,7 +277,7 @@ describe("a link for accounts", () => {
   async function logIn(page, name, password) {
     await page.getByLabel("Account name").fill(name);
     await page.getByLabel("Password").fill(password);
-    await page.getByRole("button", { name: "Log in" }).click();
+    await follow(page.getByRole("button", { name: "Log in" }));
   }
 
   visit(
@@ -286,7 +289,7 @@ describe("a link for accounts", () => {
       assert.equal(await page.getByLabel("Account name").inputValue(), "bob");
       await logIn(page, "bob", passwords.bob);
       assert.equal(await page.getByRole("table").count(), 1);
-      await page.getByRole("button", { name: "Log out" }).click();
+      await follow(page.getByRole("button", { name: "Log out" }));
       assert.equal(await heading(page), "You have logged out");
     },
     withoutScript,
@@ -304,9 +307,9 @@ describe("an open link", () => {
     async (page) => {
       await page.goto(world.share("--path", world.makeManyFiles(501), "--title", "Many"));
       assert.equal(await page.locator("td.name").count(), 500);
-      await page.getByRole("link", { name: "Next page" }).click();
+      await follow(page.getByRole("link", { name: "Next page" }));
       assert.deepEqual(await page.locator("td.name bdi").allInnerTexts(), ["501.txt"]);
-      await page.getByRole("link", { name: "Previous page" }).click();
+      await follow(page.getByRole("link", { name: "Previous page" }));
       assert.equal(await page.locator("td.name").count(), 500);
     },
     withoutScript,
@@ -327,7 +330,7 @@ describe("an open link", () => {
       const address = world.share("--path", world.shared, "--title", "Once", "--uses", "1");
       await page.goto(address);
       assert.equal(await page.getByRole("table").count(), 0);
-      await page.getByRole("button", { name: "Open" }).click();
+      await follow(page.getByRole("button", { name: "Open" }));
       assert.equal(await page.getByRole("table").count(), 1);
 
       const late = await newPage(browser);
