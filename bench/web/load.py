@@ -15,6 +15,7 @@ class Measurement:
     requests_per_second: float  # right answers only
     p50: float                  # in ms
     p99: float                  # in ms
+    processor: float            # µs of the workers for each answer
     errors: int                 # answers that were not the page, and connections that broke
     resident: float             # MB of the largest worker
     proportional: float         # the same, shared memory divided among its processes
@@ -25,6 +26,7 @@ def warm_up(subject, folder, concurrency):
 
 
 def measure(subject, folder, concurrency, seconds):
+    used_before = subject.serving.processor_seconds_of_workers()
     wrk = subprocess.Popen(_words(subject, folder, concurrency, seconds),
                            stdin=subprocess.DEVNULL, stdout=subprocess.PIPE, text=True)
     try:
@@ -36,11 +38,13 @@ def measure(subject, folder, concurrency, seconds):
         wrk.wait()
     if wrk.returncode != 0:
         raise RuntimeError(f'wrk failed: {output}')
+    used = subject.serving.processor_seconds_of_workers() - used_before
     figures = json.loads(output.splitlines()[-1])
     right = figures['answers'] - figures['wrong']
     return Measurement(
         requests_per_second=right / figures['microseconds'] * 1e6,
         p50=figures['p50'] / 1000, p99=figures['p99'] / 1000,
+        processor=used / figures['answers'] * 1e6,
         errors=figures['wrong'] + figures['broken'],
         resident=resident, proportional=proportional)
 

@@ -34,7 +34,7 @@ def options():
 
 def main():
     chosen = options()
-    program.end_on_sigterm()
+    program.prepare()
     print(report.context(), end='\n\n', flush=True)
     folder = chosen.build.resolve() / 'web-bench'
     with Shared(chosen.build.resolve(), folder, chosen.links) as shared, \

@@ -1,8 +1,8 @@
 """Programs that are started for the measurement, and end with it."""
 
 import contextlib
-import getpass
 import os
+import pwd
 import re
 import signal
 import socket
@@ -65,6 +65,15 @@ class Program:
                 proportional = max(proportional, sizes['Pss'])
         return resident / KIB_PER_MB, proportional / KIB_PER_MB
 
+    def processor_seconds_of_workers(self):
+        """What its worker processes have used so far, in the kernel and outside of it."""
+        ticks = 0
+        for pid in self._workers():
+            with contextlib.suppress(FileNotFoundError, ProcessLookupError):
+                fields = Path(f'/proc/{pid}/stat').read_text().rpartition(')')[2].split()
+                ticks += int(fields[11]) + int(fields[12])
+        return ticks / os.sysconf('SC_CLK_TCK')
+
     def _workers(self):
         pid = self._process.pid
         return Path(f'/proc/{pid}/task/{pid}/children').read_text().split()
@@ -93,14 +102,20 @@ def _memory(pid):
     return sizes
 
 
-def end_on_sigterm():
-    """SIGTERM ends this process as Ctrl-C does: programs that run are ended, too."""
+def prepare():
+    """Servers are found, which plain users have no path to. SIGTERM ends this process as Ctrl-C
+    does: programs that run are ended, too."""
+    os.environ['PATH'] += os.pathsep + '/usr/sbin'
     signal.signal(signal.SIGTERM, signal.default_int_handler)
+
+
+def this_user():
+    return pwd.getpwuid(os.geteuid()).pw_name
 
 
 def plain_user():
     """The account of whoever started this; where that is root, one that may do nothing."""
-    return UNPRIVILEGED if os.geteuid() == 0 else getpass.getuser()
+    return UNPRIVILEGED if os.geteuid() == 0 else this_user()
 
 
 def run(words):

@@ -9,7 +9,7 @@ import statistics
 from program import run
 from subject import Role
 
-HEADS = ['server', 'conc.', 'requests/s (min–max)', 'p50 ms', 'p99 ms', 'errors', 'RSS MB',
+HEADS = ['server', 'conc.', 'requests/s (min–max)', 'p50 ms', 'p99 ms', 'CPU µs', 'errors', 'RSS MB',
          'PSS MB', '× Apache', '× Apache relaxed', '× hello']
 WANTED_RATIOS = {Role.APACHE: 1.5, Role.APACHE_RELAXED: 1.5, Role.HELLO: 0.25}
 CROWD = 8            # visitors at once, of the target for p99
@@ -58,7 +58,7 @@ class Report:
 
         speeds = self._figures(subject, concurrency, 'requests_per_second')
         return [subject.name, str(concurrency), _spread(speeds, _number),
-                median('p50'), median('p99'),
+                median('p50'), median('p99'), median('processor'),
                 str(sum(self._figures(subject, concurrency, 'errors'))),
                 median('resident'), median('proportional'),
                 *(_ratio(statistics.median(self._ratios(subject, concurrency, role)))

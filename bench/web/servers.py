@@ -1,10 +1,9 @@
 """The servers that are measured side by side, and the pages on them."""
 
-import getpass
 import urllib.parse
 
 import apache
-from program import Program, configure, free_port
+from program import Program, configure, free_port, this_user
 from shared import PAGE_NAME
 from subject import Role, Subject
 
@@ -48,7 +47,7 @@ def _start_nginx(running, folder, web_socket, hello_socket):
     port = free_port()
     folder.mkdir()
     configuration = configure('nginx.conf', folder, {
-        'folder': folder, 'port': port, 'user': getpass.getuser(),
+        'folder': folder, 'port': port, 'user': this_user(),
         'web_socket': web_socket, 'hello_socket': hello_socket})
     running.enter_context(Program(
         ['nginx', '-p', folder, '-c', configuration, '-e', folder / 'error.log'],

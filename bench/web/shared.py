@@ -1,6 +1,5 @@
 """What is looked at: a small file in a folder, shared by a link among many others."""
 
-import contextlib
 import os
 import secrets
 import shutil
@@ -28,19 +27,26 @@ class Shared:
         self.link = None  # its hash
 
     def __enter__(self):
+        try:
+            self._make()
+        except BaseException:
+            self.__exit__()
+            raise
+        return self
+
+    def __exit__(self, *_):
+        for suffix in ('', '-wal', '-shm'):
+            if self._database is not None:
+                Path(self._database + suffix).unlink(missing_ok=True)
+        shutil.rmtree(self._folder, ignore_errors=True)
+
+    def _make(self):
         shutil.rmtree(self._folder, ignore_errors=True)
         self.files.mkdir(parents=True)
         for name in (PAGE_NAME, *OTHER_FILES):
             (self.files / name).write_text(_text())
         self._database = program.run([self._programs / 'velksharing_bench_links', self.links])
         self.link = self._make_link()
-        return self
-
-    def __exit__(self, *_):
-        for suffix in ('', '-wal', '-shm'):
-            with contextlib.suppress(FileNotFoundError):
-                os.remove(self._database + suffix)
-        shutil.rmtree(self._folder, ignore_errors=True)
 
     def _make_link(self):
         secret = self._folder / 'password'
