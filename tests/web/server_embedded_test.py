@@ -11,7 +11,7 @@ import unittest
 
 from server_support import *
 
-HOUR_OF_BYTES = 40 * 1024 * 1024  # more than all buffers on the way hold
+LARGE = 40 * 1024 * 1024  # more than all buffers on the way hold
 
 
 class Serving(FrontEndTest):
@@ -67,12 +67,12 @@ class Serving(FrontEndTest):
         self.assertEqual(len(ports), 1)
 
     def test_a_file_that_shrinks_on_the_way_is_cut_and_not_filled_up(self):
-        file = self.make_file("big.bin", HOUR_OF_BYTES)
+        file = self.make_file("big.bin", LARGE)
         link = self.share(file.parent)
         server = self.start()
         with Download(server.port, link, self) as download:
             os.truncate(file, 1_000_000)
-            self.assertLess(len(download.rest()), HOUR_OF_BYTES)
+            self.assertLess(len(download.rest()), LARGE)
 
     def test_200_visitors_at_once_on_a_link_with_5_uses(self):
         file = self.make_file("a.bin", 1000)
@@ -103,7 +103,7 @@ class Serving(FrontEndTest):
         self.assertEqual(results.count(404), 195)
 
     def test_a_download_holds_up_nobody(self):
-        file = self.make_file("big.bin", HOUR_OF_BYTES)
+        file = self.make_file("big.bin", LARGE)
         link = self.share(file.parent)
         server = self.start(workers=1)
         with Download(server.port, link, self):
@@ -228,7 +228,7 @@ class Workers(FrontEndTest):
 
 class Signals(FrontEndTest):
     def test_sigterm_finishes_a_download(self):
-        file = self.make_file("big.bin", HOUR_OF_BYTES)
+        file = self.make_file("big.bin", LARGE)
         link = self.share(file.parent)
         server = self.start(workers=2)
         with Download(server.port, link, self) as download:
@@ -239,14 +239,14 @@ class Signals(FrontEndTest):
         self.assertEqual(server.process.wait(10), 0)
 
     def test_sigterm_waits_no_longer_than_the_configuration_allows(self):
-        file = self.make_file("big.bin", HOUR_OF_BYTES)
+        file = self.make_file("big.bin", LARGE)
         link = self.share(file.parent)
         server = self.start("--set", "stop_timeout=1")
         with Download(server.port, link, self) as download:
             began = time.monotonic()
             self.assertEqual(server.stop(), 0)
             self.assertLess(time.monotonic() - began, 6)
-            self.assertLess(len(download.rest()), HOUR_OF_BYTES)
+            self.assertLess(len(download.rest()), LARGE)
 
     def test_sigterm_does_not_wait_for_connections_without_a_request(self):
         server = self.start()
@@ -289,14 +289,6 @@ class Signals(FrontEndTest):
         self.assertEqual(sheet(), before)
         server.signal(signal.SIGHUP)
         wait_until(lambda: sheet() != before)
-
-
-def accepts(port):
-    try:
-        socket.create_connection(("127.0.0.1", port), timeout=1).close()
-        return True
-    except OSError:
-        return False
 
 
 class Visits(FrontEndTest):

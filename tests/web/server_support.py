@@ -146,6 +146,14 @@ class FrontEnd:
         return [line.split(" ") for line in self.access_log.read_text().splitlines()]
 
 
+def accepts(port):
+    try:
+        socket.create_connection(("127.0.0.1", port), timeout=1).close()
+        return True
+    except OSError:
+        return False
+
+
 def is_alive(pid):
     try:
         return pathlib.Path(f"/proc/{pid}/stat").read_text().rpartition(")")[2].split()[0] != "Z"

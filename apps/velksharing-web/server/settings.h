@@ -32,7 +32,7 @@ struct Settings {
   std::string path = "/sharing";
   std::string site_folder;
   std::string product_name;
-  std::string runtime_folder = VELK_ROOT "/run/sharing-web";
+  std::string runtime_folder = VELK_ROOT "/etc/private/sharing-web";
   long retry_after = 600;  ///< In seconds.
 
   std::string access_log = "stderr";  ///< "off", "stderr", "syslog" or an absolute path.
