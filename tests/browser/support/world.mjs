@@ -2,7 +2,7 @@
 // to share.
 import { execFileSync, spawn } from "node:child_process";
 import { chmodSync, chownSync, mkdirSync, mkdtempSync, readdirSync, rmSync } from "node:fs";
-import { utimesSync, writeFileSync } from "node:fs";
+import { readFileSync, utimesSync, writeFileSync } from "node:fs";
 import { tmpdir } from "node:os";
 import { join } from "node:path";
 import { paint, print, tone } from "./pictures.mjs";
@@ -73,7 +73,24 @@ export class World {
       this.#server.kill("SIGTERM");
       await gone;
     }
+    this.#removeWrapperFolders();
     rmSync(this.#folder, { recursive: true, force: true });
+  }
+
+  // The wrapper of PAM cleans up when a program returns from main(), which a worker does not.
+  #removeWrapperFolders() {
+    for (const name of readdirSync("/tmp").filter((found) => found.startsWith("pam."))) {
+      const folder = join("/tmp", name);
+      if (this.#isOurs(join(folder, "velk"))) rmSync(folder, { recursive: true, force: true });
+    }
+  }
+
+  #isOurs(service) {
+    try {
+      return readFileSync(service, "utf8").includes(this.#folder);
+    } catch {
+      return false;
+    }
   }
 
   #writeAccounts() {
