@@ -102,6 +102,19 @@ class Configuration(FrontEndTest):
         self.assertRegex(run("--version").stdout, r"^velksharing-web \d+\.\d+\.\d+\n$")
 
 
+class Units(FrontEndTest):
+    @unittest.skipUnless(shutil.which("systemd-analyze"), "systemd is not there")
+    def test_the_units_are_right(self):
+        units = []
+        for name in ("velksharing-web.service", "velksharing-web.socket"):
+            text = (SOURCE / "packaging" / "systemd" / name).read_text()
+            units.append(self.folder / name)
+            units[-1].write_text(text.replace("/usr/local/sbin/velksharing-web", PROGRAM))
+        outcome = subprocess.run(["systemd-analyze", "verify", "--man=no", *map(str, units)],
+                                 text=True, capture_output=True, timeout=60)
+        self.assertEqual((outcome.returncode, outcome.stderr), (0, ""))
+
+
 class PathSockets(FrontEndTest):
     def test_an_abandoned_socket_is_replaced(self):
         path = self.folder / "socket"

@@ -15,6 +15,18 @@ LARGE = 40 * 1024 * 1024  # more than all buffers on the way hold
 
 
 class Serving(FrontEndTest):
+    def test_ipv6_is_served(self):
+        try:
+            socket.create_server(("::1", 0), family=socket.AF_INET6).close()
+        except OSError:
+            self.skipTest("no IPv6 here")
+        server = self.keep(FrontEnd(["--listen", "[::1]:0"], self.folder))
+        connection = http.client.HTTPConnection("::1", server.port, timeout=10)
+        self.addCleanup(connection.close)
+        connection.request("GET", "/sharing-health")
+        self.assertEqual(connection.getresponse().status, 200)
+        self.assertEqual(server.visits(1)[0][1], "::1")
+
     def test_a_visitor_logs_in_and_downloads_byte_for_byte(self):
         file = self.make_file("big.bin", 5_000_000)
         link = self.share(file.parent)
@@ -201,6 +213,19 @@ class Workers(FrontEndTest):
         server.process.wait()
         for worker in workers:
             wait_until(lambda worker=worker: not is_alive(worker))
+
+    def test_a_worker_without_a_database_says_so_and_is_replaced(self):
+        database = ROOT / "etc/private/session/sharing.db"
+        link = self.share(self.make_file("a.bin", 10).parent)
+        kept = database.read_bytes()
+        remove_database()
+        database.mkdir()
+        self.addCleanup(lambda: database.is_dir() and database.rmdir())
+        server = self.start(workers=1)
+        self.assertEqual(Visitor(server.port).get(f"/sharing/{link}").status, 503)
+        database.rmdir()
+        database.write_bytes(kept)
+        wait_until(lambda: Visitor(server.port).get(f"/sharing/{link}").status == 200)
 
     @unittest.skipUnless(os.geteuid() == 0, "only root has privileges to drop")
     def test_a_worker_of_root_keeps_two_capabilities(self):

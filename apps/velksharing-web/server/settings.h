@@ -25,7 +25,7 @@ struct Settings {
   std::string socket_group;  ///< Name of an existing group; "" for this program's own.
   int workers = 4;
   int connections = 256;                     ///< Of one worker, embedded.
-  int threads = 16;                          ///< Of one worker, FastCGI.
+  int threads = 64;                          ///< Of one worker, FastCGI.
   int stop_timeout = 30;                     ///< In seconds.
   std::vector<std::string> trusted_proxies;  ///< Addresses as the C library prints them, "unix".
 

@@ -45,10 +45,13 @@ done
 expect_file "$prefix"/lib/libvelksharing.so{,.6} "$prefix"/lib/libvelk{cgi,core,db,random,sdk,wins}.so{,.1}
 expect_file "$prefix"/lib/pkgconfig/velksharing.pc \
   "$prefix"/lib/cmake/velksharing/velksharing-{config,config-version,targets}.cmake
-expect_file "$prefix/sbin/velksharing" "$prefix/share/man/man8/velksharing.8"
+expect_file "$prefix"/sbin/velksharing{,-web} "$prefix"/share/man/man8/velksharing{,-web}.8
 expect_file "$stage"/usr/velk/bin/{velksharingurl,velkwebapi} \
   "$prefix"/share/man/man8/{velksharingurl,velkwebapi}.8 "$prefix/share/doc/velksharing/webapi.md"
-expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url.conf,pam/velk}
+expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url.conf,pam/velk} \
+  "$prefix"/share/doc/velksharing/examples/{sharing-web.conf,nginx/velksharing.conf} \
+  "$prefix"/share/doc/velksharing/examples/lighttpd/velksharing{,-cgi}.conf \
+  "$prefix"/share/doc/velksharing/examples/{apache/velksharing.conf,systemd/velksharing-web.service}
 expect_folder "$stage/usr/velk/etc/private" 750
 expect_folder "$stage/usr/velk/etc/private/session" 750
 
