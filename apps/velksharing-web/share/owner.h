@@ -15,7 +15,8 @@ struct Owner {
   std::vector<gid_t> groups;  ///< All of its groups, `gid` among them.
 };
 
-/// Asks the name service.
+/// Asks the name service. An answer is good for five seconds: so long may an account that is gone,
+/// or has left a group, still count. Any thread.
 /// @return nothing for an id without an account.
 std::optional<Owner> FindOwner(uid_t uid);
 
