@@ -51,6 +51,9 @@ VELK_PLATFORM_API VELKDBHandle *VELKDBConnect(const char *host, const char *user
 
 /// Runs every statement of `sql` in order and stops at the first that fails.
 ///
+/// A single SELECT, INSERT, UPDATE or DELETE that differs from one of the last 64 in its values
+/// alone is not compiled again. Nothing but the time tells.
+///
 /// @param result receives the rows of the last statement that yields columns, read to their end,
 ///        or null when there is none; to be freed with VELKDBFreeResult(). May be null. Is set to
 ///        null on failure.
