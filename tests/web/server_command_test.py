@@ -102,6 +102,15 @@ class Configuration(FrontEndTest):
         self.assertRegex(run("--version").stdout, r"^velksharing-web \d+\.\d+\.\d+\n$")
 
 
+class Libraries(unittest.TestCase):
+    @unittest.skipUnless(shutil.which("dpkg-query"), "not a Debian system")
+    def test_the_fastcgi_library_has_its_hole_mended(self):
+        version = subprocess.run(["dpkg-query", "-W", "-f", "${Version}", "libfcgi0ldbl"],
+                                 text=True, stdout=subprocess.PIPE, check=True).stdout
+        subprocess.run(["dpkg", "--compare-versions", version, "ge", "2.4.2-2+deb12u1"],
+                       check=True)
+
+
 class Units(FrontEndTest):
     @unittest.skipUnless(shutil.which("systemd-analyze"), "systemd is not there")
     def test_the_units_are_right(self):
