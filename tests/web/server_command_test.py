@@ -207,8 +207,8 @@ class HandedOver(FrontEndTest):
         with socket.create_connection(self.listening.getsockname(), timeout=10) as own:
             return fastcgi(own, **variables)
 
-    def serve_standard_input(self):
-        words = [PROGRAM, "--access-log", str(self.folder / "access.log"), "--workers", "2"]
+    def serve_standard_input(self, *options):
+        words = [PROGRAM, "--access-log", str(self.folder / "access.log"), *options]
         environment = {**os.environ, "GATEWAY_INTERFACE": "CGI/1.1"}
         process = subprocess.Popen(words, stdin=self.listening, env=environment,
                                    stderr=subprocess.DEVNULL)
@@ -244,6 +244,19 @@ class HandedOver(FrontEndTest):
             for _ in range(3):
                 answer = self.ask(kept, keep=True, REQUEST_URI="/sharing-health")
                 self.assertIn(b" 200 ", answer)
+
+    def test_a_connection_that_is_kept_for_nothing_keeps_nobody_out(self):
+        self.serve_standard_input("--workers", "1", "--set", "threads=1")
+        with socket.create_connection(self.listening.getsockname(), timeout=10) as kept:
+            self.ask(kept, keep=True, REQUEST_URI="/sharing-health")
+            self.assertIn(b" 200 ", self.ask(REQUEST_URI="/sharing-health"))
+
+    def test_connections_on_which_nothing_comes_keep_nobody_out(self):
+        self.serve_standard_input("--workers", "1", "--set", "threads=3")
+        silent = [socket.create_connection(self.listening.getsockname()) for _ in range(2)]
+        self.assertIn(b" 200 ", self.ask(REQUEST_URI="/sharing-health"))
+        for connection in silent:
+            connection.close()
 
     def test_an_authorizer_lets_nobody_in(self):
         self.serve_standard_input()

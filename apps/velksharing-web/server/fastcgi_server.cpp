@@ -28,12 +28,14 @@ constexpr int kLookAround = 1000;  // milliseconds between looks whether others 
 /// A request of the web server, and the connection that it came by.
 class Channel {
  public:
-  explicit Channel(int listening_socket);
+  Channel();
   Channel(const Channel &) = delete;
   Channel &operator=(const Channel &) = delete;
   ~Channel() { Cut(); }
 
-  /// Takes the next request, of the connection that was kept, else of a new one.
+  /// Takes over a new connection. There must be none.
+  void Adopt(UniqueFd connection);
+  /// Takes the next request of the connection.
   bool Accept() { return FCGX_Accept_r(&request_) == 0; }
   /// Ends an answer that was given whole.
   bool Finish();
@@ -52,8 +54,19 @@ class Channel {
   FCGX_Request request_ = {};
 };
 
-Channel::Channel(int listening_socket) {
-  FCGX_InitRequest(&request_, listening_socket, FCGI_FAIL_ACCEPT_ON_INTR);
+Channel::Channel() {
+  // The library takes no connections by itself: it would wait for one, and for what comes on it,
+  // while nobody else could take any.
+  constexpr int kNoSocket = -1;
+  FCGX_InitRequest(&request_, kNoSocket, FCGI_FAIL_ACCEPT_ON_INTR);
+}
+
+void Channel::Adopt(UniqueFd connection) {
+  const timeval patience = {kPatience.count(), 0};
+  for (const int direction : {SO_RCVTIMEO, SO_SNDTIMEO})
+    setsockopt(connection.get(), SOL_SOCKET, direction, &patience, sizeof(patience));
+  request_.ipcFd = connection.Release();
+  request_.keepConnection = 1;  // or the library begins by closing it
 }
 
 bool Channel::Finish() {
@@ -87,7 +100,7 @@ class FastCgiServerPrivate {
  private:
   void Serve(std::atomic<int> &connection);
   bool AcceptNext(Channel &channel);
-  bool AcceptNew(Channel &channel);
+  UniqueFd AcceptConnection();
   bool AcceptCounted(Channel &channel);
   bool WaitForKept(Channel &channel);
   bool IsStopped() const;
@@ -126,7 +139,7 @@ FastCgiServerPrivate::~FastCgiServerPrivate() {
 }
 
 void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
-  Channel channel(listening_socket_);
+  Channel channel;
   while (!IsStopped()) {
     if (!AcceptNext(channel)) continue;
     connection = channel.connection();
@@ -136,18 +149,22 @@ void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
 }
 
 bool FastCgiServerPrivate::AcceptNext(Channel &channel) {
-  if (channel.connection() < 0) return AcceptNew(channel);
-  return WaitForKept(channel) && AcceptCounted(channel);
+  if (channel.connection() >= 0) return WaitForKept(channel) && AcceptCounted(channel);
+  UniqueFd connection = AcceptConnection();
+  if (!connection.IsOpen()) return false;
+  channel.Adopt(std::move(connection));
+  return AcceptCounted(channel);
 }
 
-bool FastCgiServerPrivate::AcceptNew(Channel &channel) {
+UniqueFd FastCgiServerPrivate::AcceptConnection() {
   ++free_threads_;
   // One thread at a time looks at the socket, or a request would wake them all.
   const std::lock_guard guard(accepting_);
   pollfd watched[] = {{stop_.get(), POLLIN, 0}, {listening_socket_, POLLIN, 0}};
   poll(watched, 2, -1);
   --free_threads_;
-  return !IsReady(watched[0]) && IsReady(watched[1]) && AcceptCounted(channel);
+  if (IsReady(watched[0])) return UniqueFd();
+  return UniqueFd(accept4(listening_socket_, nullptr, nullptr, SOCK_CLOEXEC));
 }
 
 bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {
