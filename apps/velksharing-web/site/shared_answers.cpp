@@ -95,8 +95,8 @@ SharedAnswers::SharedAnswers(const Answers &answers, const Pages &pages, const S
                              const share::SharedTree &tree)
     : answers_(answers), pages_(pages), view_(view), tree_(tree) {}
 
-Response SharedAnswers::Answer(const SharedRequest &wanted, AccessNote &note) const {
-  std::optional<share::Item> item = tree_.Find(wanted.parts);
+Response SharedAnswers::Answer(const SharedRequest &wanted, std::optional<share::Item> item,
+                               AccessNote &note) const {
   if (!item || (!item->is_folder && !wanted.parts.empty() && wanted.ends_with_slash))
     return answers_.Error(404);
   if (item->is_folder) return Folder(wanted, *item, note);

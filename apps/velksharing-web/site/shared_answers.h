@@ -1,6 +1,7 @@
 #ifndef VELKSHARING_WEB_SITE_SHARED_ANSWERS_H
 #define VELKSHARING_WEB_SITE_SHARED_ANSWERS_H
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -40,8 +41,10 @@ class SharedAnswers {
   SharedAnswers(const Answers &answers, const Pages &pages, const SharedView &view,
                 const share::SharedTree &tree);
 
+  /// @param item what is asked for; nothing when it is not there.
   /// @param note its route is set.
-  Response Answer(const SharedRequest &wanted, AccessNote &note) const;
+  Response Answer(const SharedRequest &wanted, std::optional<share::Item> item,
+                  AccessNote &note) const;
 
  private:
   Response Folder(const SharedRequest &wanted, const share::Item &folder, AccessNote &note) const;
