@@ -115,7 +115,9 @@ Result LinkVisit::LogInOneByOne(const Link &link, const Form &form, std::string 
 
 Response LinkVisit::Show(Link &link, const SharedRequest &wanted) {
   if (!link.target.empty()) return SendOn(link);
-  const SharedView view = {ViewOf(link), FormReader(), address_, link.CanDownload()};
+  // A token costs more than a small file.
+  const Reader reader = wanted.AsksForBytes() ? Reader{answers_.language(), ""} : FormReader();
+  const SharedView view = {ViewOf(link), reader, address_, link.CanDownload()};
   Response response = SharedAnswers(answers_, site_.pages, view, *link.tree)
                           .Answer(wanted, std::move(link.item), note_);
   if (response.headers.Get("Content-Type") == Pages::kContentType) visitor_.KeepFormKey(response);

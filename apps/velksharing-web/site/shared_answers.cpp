@@ -91,6 +91,10 @@ bool IsAttachment(const Response &response) {
 
 }  // namespace
 
+bool SharedRequest::AsksForBytes() const {
+  return query.Has("download") || query.Has("view") || query.Has("thumbnail") || query.Has("zip");
+}
+
 SharedAnswers::SharedAnswers(const Answers &answers, const Pages &pages, const SharedView &view,
                              const share::SharedTree &tree)
     : answers_(answers), pages_(pages), view_(view), tree_(tree) {}

@@ -23,6 +23,9 @@ struct SharedRequest {
   const Form &query;
   std::vector<std::string> parts;  ///< Names below what is shared.
   bool ends_with_slash = false;
+
+  /// Whether the answer is no page of ours, but a file, an image or an archive.
+  bool AsksForBytes() const;
 };
 
 /// How a link shows what it shares.
