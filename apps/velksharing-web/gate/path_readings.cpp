@@ -25,11 +25,12 @@ std::optional<char> EscapedByte(std::string_view text, size_t at) {
   return static_cast<char>(high * 16 + low);
 }
 
-/// Whether an escape has to stay one as long as nobody decodes the path: it need not be one, or
-/// what it leaves would look like another.
+/// Whether an escape stays one as long as nobody decodes the path: it need not be one, so that it
+/// tells the path from others; or the bare byte would mean something else there.
 bool IsKept(char byte, std::string_view behind) {
-  if (byte != '%') return IsPlainInPath(byte);
-  return behind.size() >= 2 && HexDigitValue(behind[0]) >= 0 && HexDigitValue(behind[1]) >= 0;
+  if (byte == '%')
+    return behind.size() >= 2 && HexDigitValue(behind[0]) >= 0 && HexDigitValue(behind[1]) >= 0;
+  return byte == '\\' || IsPlainInPath(byte);
 }
 
 /// The text of the reading that is closest to what was sent.
