@@ -21,6 +21,8 @@ SiteSettings ForSite(const Settings &settings, std::string form_secret) {
   site.runtime_folder = settings.runtime_folder;
   site.form_secret = std::move(form_secret);
   site.retry_after = settings.retry_after;
+  site.has_gate = settings.auth_address != AuthAddress::OFF;
+  site.guarded = settings.guarded;
   return site;
 }
 

@@ -8,6 +8,7 @@
 #include "common/address.h"
 #include "common/config_file.h"
 #include "server/printable.h"
+#include "site/routes.h"
 
 namespace web {
 namespace {
@@ -17,6 +18,8 @@ using velk::ConfigNumber;
 
 constexpr size_t kLongestSocketPath = 107;
 constexpr size_t kLongestProductName = 200;
+constexpr std::string_view kAuthAddress = "auth_address";
+constexpr std::string_view kProtect = "protect";
 
 bool IsControl(char byte) {
   return static_cast<unsigned char>(byte) < ' ' || byte == '\x7f';
@@ -60,8 +63,14 @@ void SetListen(std::string_view value, Settings &settings) {
   settings.listen = value;
 }
 
+/// "127.0.0.1:9000", "[::1]:9000".
+bool IsOnLoopback(std::string_view value) {
+  return value.starts_with("127.0.0.1:") || value.starts_with("[::1]:");
+}
+
 void SetFastCgi(std::string_view value, Settings &settings) {
-  settings.fastcgi = AbsolutePath(value);
+  // Whoever speaks FastCGI says who the visitor is.
+  settings.fastcgi = IsOnLoopback(value) ? std::string(value) : AbsolutePath(value);
   if (settings.fastcgi.size() > kLongestSocketPath)
     throw ConfigMistake("longer than " + std::to_string(kLongestSocketPath) + " bytes");
 }
@@ -135,6 +144,30 @@ void SetAccessLog(std::string_view value, Settings &settings) {
   settings.access_log = is_word ? std::string(value) : AbsolutePath(value);
 }
 
+void SetAuthAddress(std::string_view value, Settings &settings) {
+  constexpr std::pair<std::string_view, AuthAddress> kWords[] = {
+      {"off", AuthAddress::OFF},
+      {"parameter", AuthAddress::PARAMETER},
+      {"authorizer", AuthAddress::AUTHORIZER},
+      {"x-forwarded", AuthAddress::X_FORWARDED},
+      {"x-original-url", AuthAddress::X_ORIGINAL_URL},
+  };
+  const auto *word = std::find_if(std::begin(kWords), std::end(kWords),
+                                  [value](const auto &known) { return known.first == value; });
+  if (word == std::end(kWords))
+    throw ConfigMistake("none of off, parameter, authorizer, x-forwarded, x-original-url");
+  settings.auth_address = word->second;
+}
+
+void SetProtect(std::string_view value, Settings &settings) {
+  const std::vector<std::string_view> words = Words(value);
+  if (words.size() != 2) throw ConfigMistake("not a prefix of addresses and the hash of a link");
+  auto prefix = gate::Prefix::Parse(words[0]);
+  if (!prefix) throw ConfigMistake("no prefix of addresses: " + Printable(words[0]));
+  if (!IsHash(words[1])) throw ConfigMistake("no hash of a link: " + Printable(words[1]));
+  settings.guarded.push_back({std::move(*prefix), std::string(words[1])});
+}
+
 void SetFileDelivery(std::string_view value, Settings &settings) {
   if (value == "copy") {
     settings.file_delivery = FileDelivery::COPY;
@@ -178,6 +211,8 @@ constexpr Key kKeys[] = {
     {"product_name", SetProductName},
     {"runtime_folder", SetRuntimeFolder},
     {"retry_after", SetRetryAfter},
+    {kAuthAddress, SetAuthAddress},
+    {kProtect, SetProtect},
     {"access_log", SetAccessLog},
     {"file_delivery", SetFileDelivery},
     {"file_folders", SetFileFolders},
@@ -201,7 +236,8 @@ void Apply(std::string_view key, std::string_view value, Settings &settings) {
 Settings ReadSettings(const std::string &file) {
   Settings settings;
   velk::ReadConfigFile(
-      file, [&](std::string_view key, std::string_view value) { Apply(key, value, settings); });
+      file, [&](std::string_view key, std::string_view value) { Apply(key, value, settings); },
+      {kProtect});
   return settings;
 }
 
@@ -210,6 +246,12 @@ void CheckTogether(const Settings &settings) {
     throw ConfigMistake("listen and fastcgi exclude each other");
   if (settings.file_delivery != FileDelivery::COPY && settings.file_folders.empty())
     throw ConfigMistake("file_delivery by the web server needs file_folders");
+  const bool asks_by_http = settings.auth_address == AuthAddress::X_FORWARDED ||
+                            settings.auth_address == AuthAddress::X_ORIGINAL_URL;
+  if (asks_by_http && settings.trusted_proxies.empty())
+    throw ConfigMistake("auth_address in header fields needs trusted_proxy");
+  if (settings.auth_address == AuthAddress::OFF && !settings.guarded.empty())
+    throw ConfigMistake("protect needs auth_address");
 }
 
 }  // namespace web

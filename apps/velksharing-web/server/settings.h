@@ -7,6 +7,8 @@
 #include <string_view>
 #include <vector>
 
+#include "gate/guarded_prefix.h"
+
 namespace web {
 
 /// How the bytes of files reach the visitor under FastCGI.
@@ -16,11 +18,20 @@ enum class FileDelivery {
   X_SENDFILE,        ///< The web server reads them, told by a path (lighttpd, Apache).
 };
 
+/// Where a web server that asks whether a visitor may see something names what that is.
+enum class AuthAddress {
+  OFF,             ///< Nowhere: no visitor may see anything.
+  PARAMETER,       ///< FastCGI parameter VELK_SHARING_AUTH.
+  AUTHORIZER,      ///< In the variables of a FastCGI authorizer: its own view of the request.
+  X_FORWARDED,     ///< Header fields X-Forwarded-Proto, X-Forwarded-Host, X-Forwarded-Uri.
+  X_ORIGINAL_URL,  ///< Header field X-Original-URL.
+};
+
 /// What VELK_ROOT/etc/sharing-web.conf and the command line decide. docs/man/velksharing-web.8
 /// tells what each key means; here they have their names, checked, with their defaults.
 struct Settings {
   std::string listen;   ///< "" where neither `listen` nor `fastcgi` is given: the default address.
-  std::string fastcgi;  ///< Path of the FastCGI socket; "" for none.
+  std::string fastcgi;  ///< Path or loopback address of the FastCGI socket; "" for none.
   mode_t socket_mode = 0660;
   std::string socket_group;  ///< Name of an existing group; "" for this program's own.
   int workers = 4;
@@ -34,6 +45,9 @@ struct Settings {
   std::string product_name;
   std::string runtime_folder = VELK_ROOT "/etc/private/sharing-web";
   long retry_after = 600;  ///< In seconds.
+
+  AuthAddress auth_address = AuthAddress::OFF;
+  std::vector<gate::GuardedPrefix> guarded;  ///< Key "protect".
 
   std::string access_log = "stderr";  ///< "off", "stderr", "syslog" or an absolute path.
 

@@ -3,7 +3,9 @@
 
 #include <memory>
 #include <string>
+#include <vector>
 
+#include "gate/guarded_prefix.h"
 #include "http/request.h"
 #include "http/response.h"
 
@@ -29,12 +31,16 @@ struct SiteSettings {
   std::string form_secret;
   /// Seconds after which a blocked visitor is told to try again.
   long retry_after = 600;
+  /// Whether links guard addresses of other servers, who ask here.
+  bool has_gate = false;
+  /// What links guard by the configuration's word; by their own they may guard more.
+  std::vector<gate::GuardedPrefix> guarded{};
 };
 
 /// What the access log may say about a request: nothing secret, nothing that opens a link.
 struct AccessNote {
   /// What the request was about: "page", "folder", "file", "download", "view", "thumbnail", "zip",
-  /// "redirect", "login", "logout", "asset", "health" or "none".
+  /// "redirect", "login", "logout", "auth", "asset", "health" or "none".
   std::string route = "none";
   /// The link's hash, shortened to its first three characters and "…" (less of a hash that is
   /// short); "" for none. The shared path is left out: file names are the owner's business.
