@@ -40,9 +40,9 @@ constexpr size_t kMostReadings = 64;
 ///
 /// @param path begins with "/"; without query. A slash at its end makes no difference.
 /// @return distinct readings, the one that is closest to what was sent first; nothing for a path
-///         that holds a blank, a control character, a broken escape, a character of UTF-8 that is
-///         longer than it need be, or any of the latter two behind more escapes; and for one with
-///         more than `kMostReadings`.
+///         that holds a bare blank, a control character or a character of UTF-8 that is longer than
+///         it need be, bare or behind escapes, or a broken escape; and for one with more than
+///         `kMostReadings`.
 std::optional<std::vector<Reading>> ReadingsOf(std::string_view path);
 
 /// The reading of a path that can be read in one way. Escapes without need do not count: they are
