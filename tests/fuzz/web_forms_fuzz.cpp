@@ -1,5 +1,5 @@
-// Any bytes as the body of a form, or as a query: what is read must be what a slow and simple reader
-// finds, and what is read must come back when it is encoded and read again.
+// Any bytes as the body of a form, or as a query: what is read must be what a slow and simple
+// reader finds, and what is read must come back when it is encoded and read again.
 
 #include <cstdint>
 #include <optional>

@@ -1,5 +1,5 @@
-// Any bytes as the head of an HTTP request: which fields the HTTP library found in it is made up, too.
-// What passes must be so plain that every other reader finds the same fields.
+// Any bytes as the head of an HTTP request: which fields the HTTP library found in it is made up,
+// too. What passes must be so plain that every other reader finds the same fields.
 
 #include <cstdint>
 #include <string>

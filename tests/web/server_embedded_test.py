@@ -95,12 +95,9 @@ class Serving(FrontEndTest):
 
         def visit():
             visitor = Visitor(server.port)
-            page = visitor.get(f"/sharing/{link}")
-            token = re.search(rb'name="csrf" value="([^"]*)"', page.body).group(1).decode()
-            form = urllib.parse.urlencode({"password": PASSWORD, "csrf": token})
+            form = {"password": PASSWORD, "csrf": visitor.form_token(link)}
             ready.wait(60)
-            answer = visitor.request("POST", f"/sharing/{link}", form, {
-                "Content-Type": "application/x-www-form-urlencoded"}, timeout=90)
+            answer = visitor.submit(f"/sharing/{link}", form, timeout=90)
             results.append(answer.status)
             if answer.status == 303:
                 results.append(("in", visitor.get(f"/sharing/{link}").status))
