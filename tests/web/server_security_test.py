@@ -260,7 +260,8 @@ class ForeignForms:
     def test_from_other_sites_are_refused_with_a_right_token_too(self):
         host = f"127.0.0.1:{self.port}"
         for origin in (f"http://{EVIL}", f"https://{EVIL}", f"http://{host}.{EVIL}", EVIL,
-                       f"http://{EVIL}/{host}", f"http://{EVIL}#{host}", f"http://{host}@{EVIL}", "file://", "x"):
+                       f"http://{EVIL}/{host}", f"http://{EVIL}#{host}", f"http://{host}@{EVIL}",
+                       "file://", "x"):
             self.assert_refused(self.victim, self.form(self.token), {"Origin": origin})
         for site in ("cross-site", "same-site", "Same-Origin", "same-origin, cross-site", "x"):
             for origin in (f"http://{host}", "null"):
