@@ -17,7 +17,8 @@ using EmbeddedResponse = std::unique_ptr<MHD_Response, decltype(&MHD_destroy_res
 /// @param response gives its body away.
 /// @param bytes counts what a stream gives; must live as long as the answer is being sent.
 /// @return null when memory runs out.
-EmbeddedResponse MakeEmbeddedResponse(Response &response, uint64_t &bytes);
+EmbeddedResponse MakeEmbeddedResponse(Response &response, const std::string &method,
+                                      uint64_t &bytes);
 
 }  // namespace web
 
