@@ -4,13 +4,15 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <cstdlib>
 #include <string>
 
 #include "binding.h"
 #include "literals.h"
+#include "require.h"
 
 namespace {
+
+using velk_test::Require;
 
 constexpr char kSchema[] =
     "CREATE TABLE t (id INTEGER PRIMARY KEY, a TEXT, b INTEGER, c REAL, d, e TEXT UNIQUE);"
@@ -90,10 +92,6 @@ class Database {
   sqlite3 *connection_ = nullptr;
   int steps_ = 0;
 };
-
-void Require(bool condition) {
-  if (!condition) std::abort();
-}
 
 Outcome RunLifted(Database &database, sqlite3_stmt *statement, const velkdb::LiftedText &lifted) {
   Require(sqlite3_bind_parameter_count(statement) == static_cast<int>(lifted.literals.size()));

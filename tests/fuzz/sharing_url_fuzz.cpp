@@ -9,8 +9,11 @@
 #include <string>
 
 #include "played_program.h"
+#include "require.h"
 
 namespace {
+
+using velk_test::Require;
 
 /// Takes the first line off `text`, or as much of it as `limit` bytes are.
 std::string TakeLine(std::string &text, size_t limit) {
@@ -23,10 +26,6 @@ std::string TakeLine(std::string &text, size_t limit) {
 
 std::string UpToZeroByte(const std::string &text) {
   return text.substr(0, text.find('\0'));
-}
-
-void Require(bool holds) {
-  if (!holds) abort();
 }
 
 }  // namespace

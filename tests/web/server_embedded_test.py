@@ -59,6 +59,33 @@ class Serving(FrontEndTest):
         self.assertIsNone(answer.headers["Content-Length"])
         self.assertEqual(answer.body, b"")
 
+    def test_nothing_follows_the_head_of_an_answer_without_a_body(self):
+        file = self.make_file("a.bin", 1000)
+        link = self.share(file.parent)
+        visitor = Visitor(self.start().port)
+        visitor.log_in(link)
+        path = f"/sharing/{link}/a.bin?download"
+        tag = visitor.get(path).headers["ETag"]
+        archive = f"/sharing/{link}?zip"
+        for method, target, status in (("GET", path, 304), ("HEAD", path, 304),
+                                       ("HEAD", archive, 200)):
+            raw = (f"{method} {target} HTTP/1.1\r\nHost: localhost\r\nIf-None-Match: {tag}\r\n"
+                   f"Cookie: sharing_sid={visitor.cookies['sharing_sid']}\r\n\r\n")
+            received = b"".join(self.pieces_within(0.5, visitor.port, raw.encode()))
+            self.assertEqual(statuses(received), [status])
+            # Whatever came would be taken for the next answer's beginning.
+            self.assertEqual(received.partition(b"\r\n\r\n")[2], b"")
+
+    def pieces_within(self, seconds, port, raw):
+        """What comes on a connection that the visitor keeps."""
+        with socket.create_connection(("127.0.0.1", port), timeout=seconds) as connection:
+            connection.sendall(raw)
+            try:
+                while piece := connection.recv(65536):
+                    yield piece
+            except TimeoutError:
+                pass
+
     def test_head_tells_the_length_and_sends_nothing(self):
         file = self.make_file("a.bin", 1000)
         link = self.share(file.parent)
@@ -95,12 +122,9 @@ class Serving(FrontEndTest):
 
         def visit():
             visitor = Visitor(server.port)
-            page = visitor.get(f"/sharing/{link}")
-            token = re.search(rb'name="csrf" value="([^"]*)"', page.body).group(1).decode()
-            form = urllib.parse.urlencode({"password": PASSWORD, "csrf": token})
+            form = {"password": PASSWORD, "csrf": visitor.form_token(link)}
             ready.wait(60)
-            answer = visitor.request("POST", f"/sharing/{link}", form, {
-                "Content-Type": "application/x-www-form-urlencoded"}, timeout=90)
+            answer = visitor.submit(f"/sharing/{link}", form, timeout=90)
             results.append(answer.status)
             if answer.status == 303:
                 results.append(("in", visitor.get(f"/sharing/{link}").status))

@@ -4,56 +4,32 @@ child on a free port of loopback, with a folder of its own."""
 
 import os
 import signal
-import socket
-import subprocess
 import time
 import unittest
 
 from server_support import *
+from web_servers import *
 
 SIZE = 5_000_000
-PACKAGING = SOURCE / "packaging"
 
 
-def free_port():
-    with socket.socket() as probe:
-        probe.bind(("127.0.0.1", 0))
-        return probe.getsockname()[1]
-
-
-def adapted(file, *changes):
-    """A configuration of packaging/, with each text in the place of another."""
-    text = (PACKAGING / file).read_text()
-    for old, new in changes:
-        if old not in text:
-            raise AssertionError(f"{file} has no {old}")
-        text = text.replace(old, str(new))
-    return text
-
-
-class WebServer:
-    """What all web servers are made to do; the classes below say how each is started."""
-
-    SOCKET = "/run/velksharing-web.sock"
+class WebServerTests:
+    """What all web servers are made to do; the classes below say which."""
 
     def setUp(self):
         super().setUp()
         self.file = self.make_file("big file.bin", SIZE)
         self.link = self.share(self.file.parent)
-        self.port = free_port()
         self.socket = self.folder / "socket"
         self.server = None
-        self.start_web_server()
-        wait_until(self.listens)
+        web_server = self.WEB_SERVER(self, self.folder)
+        web_server.start(adapted(web_server.FILE, (SOCKET, self.socket), *web_server.CHANGES,
+                                 *self.changes()))
+        self.port = web_server.port
 
-    def listens(self):
-        self.assertIsNone(self.web_server.poll(), "the web server does not run")
-        return accepts(self.port)
-
-    def run_web_server(self, *words):
-        self.web_server = subprocess.Popen(words, cwd=self.folder)
-        self.addCleanup(self.web_server.wait)
-        self.addCleanup(self.web_server.terminate)
+    def changes(self):
+        """What else is different in the configuration of packaging/."""
+        return []
 
     def start_front_end(self, *options):
         words = ["--fastcgi", str(self.socket), "--set", "socket_mode=666", *options]
@@ -119,22 +95,8 @@ class WebServer:
             visitor.get(f"/sharing/{self.link}?zip")
 
 
-class Nginx(WebServer, FrontEndTest):
-    def start_web_server(self):
-        snippet = self.folder / "velksharing.conf"
-        snippet.write_text(adapted("nginx/velksharing.conf", (self.SOCKET, self.socket),
-                                   ("include fastcgi", "include /etc/nginx/fastcgi")))
-        temporary = "".join(f"{kind}_temp_path {self.folder}/{kind};\n" for kind in (
-            "client_body", "fastcgi", "proxy", "scgi", "uwsgi"))
-        config = self.folder / "nginx.conf"
-        config.write_text(f"""
-daemon off; worker_processes 1; pid {self.folder}/nginx.pid; error_log {self.folder}/nginx.log;
-events {{ }}
-http {{
-  access_log off; {temporary}
-  server {{ listen 127.0.0.1:{self.port}; include {snippet}; }}
-}}""")
-        self.run_web_server("/usr/sbin/nginx", "-e", f"{self.folder}/nginx.log", "-c", str(config))
+class Nginx(WebServerTests, FrontEndTest):
+    WEB_SERVER = NginxServer
 
     def let_nginx_read(self):
         self.start_front_end("--set", "file_delivery=x-accel-redirect",
@@ -166,86 +128,39 @@ http {{
         self.assertEqual(self.log_in().get(self.download()).body, self.file.read_bytes())
 
 
-def lighttpd_head(folder, port):
-    return f"""
-server.bind = "127.0.0.1"
-server.port = {port}
-server.document-root = "{folder}"
-server.errorlog = "{folder}/lighttpd.log"
-server.upload-dirs = ( "{folder}" )
-"""
-
-
-class Lighttpd(WebServer, FrontEndTest):
-    def start_web_server(self):
-        config = self.folder / "lighttpd.conf"
-        config.write_text(lighttpd_head(self.folder, self.port) + adapted(
-            "lighttpd/velksharing.conf", *self.changes()))
-        self.run_web_server("/usr/sbin/lighttpd", "-D", "-f", str(config))
-
-    def changes(self):
-        return [(self.SOCKET, self.socket)]
+class Lighttpd(WebServerTests, FrontEndTest):
+    WEB_SERVER = LighttpdServer
 
 
 class LighttpdReads(Lighttpd):
     """lighttpd sends the files by itself."""
 
     def changes(self):
-        return [*super().changes(), ('#"x-sendfile', '"x-sendfile'),
-                ("/srv/shared", self.file.parent)]
+        return [('#"x-sendfile', '"x-sendfile'), ("/srv/shared", self.file.parent)]
 
     def start_front_end(self, *options):
         super().start_front_end("--set", "file_delivery=x-sendfile",
                                 "--set", f"file_folders={self.file.parent}", *options)
 
 
-class Apache(WebServer, FrontEndTest):
-    MODULES = ("mpm_event", "authz_core", "proxy", "proxy_fcgi")
-    FILE = "apache/velksharing.conf"
-
-    def start_web_server(self):
-        modules = "".join(f"LoadModule {module}_module /usr/lib/apache2/modules/mod_{module}.so\n"
-                          for module in self.MODULES)
-        config = self.folder / "apache.conf"
-        user = "User www-data\nGroup www-data\n" if os.geteuid() == 0 else ""
-        config.write_text(f"""
-ServerRoot {self.folder}
-ServerName localhost
-Listen 127.0.0.1:{self.port}
-PidFile {self.folder}/apache.pid
-ErrorLog {self.folder}/apache.log
-DefaultRuntimeDir {self.folder}
-Mutex posixsem
-DocumentRoot {self.folder}
-{modules}{user}{self.extra()}{adapted(self.FILE, *self.changes())}""")
-        self.run_web_server("/usr/sbin/apache2", "-D", "FOREGROUND", "-f", str(config))
-
-    def extra(self):
-        return ""
-
-    def changes(self):
-        return [(self.SOCKET, self.socket)]
+class Apache(WebServerTests, FrontEndTest):
+    WEB_SERVER = ApacheServer
 
 
-class PlainCgi(FrontEndTest):
-    """A process for each request, under lighttpd."""
+class PlainCgiTests:
+    """A process for each request."""
 
     def setUp(self):
         super().setUp()
         self.file = self.make_file("big file.bin", SIZE)
         self.link = self.share(self.file.parent)
-        self.port = free_port()
         self.access_log = self.folder / "access.log"
         settings = ROOT / "etc" / "sharing-web.conf"
         settings.write_text(f"access_log = {self.access_log}\n")
         self.addCleanup(settings.unlink)
-        config = self.folder / "lighttpd.conf"
-        config.write_text(lighttpd_head(self.folder, self.port) + adapted(
-            "lighttpd/velksharing-cgi.conf", ("/usr/local/sbin/velksharing-web", PROGRAM)))
-        web_server = subprocess.Popen(["/usr/sbin/lighttpd", "-D", "-f", str(config)])
-        self.addCleanup(web_server.wait)
-        self.addCleanup(web_server.terminate)
-        wait_until(lambda: accepts(self.port))
+        web_server = self.WEB_SERVER(self, self.folder)
+        web_server.start_cgi()
+        self.port = web_server.port
 
     def test_a_visitor_logs_in_and_downloads_byte_for_byte(self):
         visitor = Visitor(self.port)
@@ -263,6 +178,14 @@ class PlainCgi(FrontEndTest):
         for query in ("--help", "--version", "--check-config", "--listen=127.0.0.1:1"):
             answer = Visitor(self.port).get(f"/sharing-health?{query}")
             self.assertEqual((answer.status, answer.body), (200, b"ok\n"))
+
+
+class LighttpdCgi(PlainCgiTests, FrontEndTest):
+    WEB_SERVER = LighttpdServer
+
+
+class ApacheCgi(PlainCgiTests, FrontEndTest):
+    WEB_SERVER = ApacheServer
 
 
 if __name__ == "__main__":

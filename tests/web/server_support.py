@@ -37,6 +37,11 @@ def main():
     unittest.main(verbosity=2)
 
 
+def preloaded(name):
+    """One of the libraries that are loaded before a program, for LD_PRELOAD."""
+    return str(BUILD / "lib" / f"libweb_{name}.so")
+
+
 def remove_database():
     for path in glob.glob(str(ROOT / "etc/private/session/sharing.db*")):
         os.remove(path)
@@ -197,13 +202,20 @@ class Visitor:
     def get(self, path, headers=None, **how):
         return self.request("GET", path, headers=headers, **how)
 
+    def form_token(self, link):
+        """The token of the login form."""
+        page = self.get(f"{self.base}/{link}")
+        return re.search(rb'name="csrf" value="([^"]*)"', page.body).group(1).decode()
+
+    def submit(self, path, fields, headers=None, **how):
+        """Sends a form."""
+        headers = {"Content-Type": "application/x-www-form-urlencoded", **(headers or {})}
+        return self.request("POST", path, urllib.parse.urlencode(fields), headers, **how)
+
     def log_in(self, link, password=PASSWORD):
         """Fills the login form in, and sends it."""
-        page = self.get(f"{self.base}/{link}")
-        token = re.search(rb'name="csrf" value="([^"]*)"', page.body).group(1).decode()
-        form = urllib.parse.urlencode({"password": password, "csrf": token})
-        return self.request("POST", f"{self.base}/{link}", form,
-                            {"Content-Type": "application/x-www-form-urlencoded"})
+        fields = {"password": password, "csrf": self.form_token(link)}
+        return self.submit(f"{self.base}/{link}", fields)
 
 
 def exchange(port, raw, timeout=10):

@@ -49,16 +49,28 @@ MHD_Response *WithStream(std::unique_ptr<StreamBody> body, uint64_t &bytes) {
   return response;
 }
 
-/// An empty text would get the length 0, which 304 would tell of what the visitor has already.
+/// An empty text would get the length 0, which 304 would tell of what the visitor has already. A
+/// body of unknown length would get its last chunk although there is no body: the visitor would
+/// take that for the beginning of the next answer. So the connection ends with this one.
 MHD_Response *WithoutBody() {
   const auto nothing = [](void *, uint64_t, char *, size_t) -> ssize_t {
     return MHD_CONTENT_READER_END_OF_STREAM;
   };
-  return MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, 1, nothing, nullptr, nullptr);
+  MHD_Response *response =
+      MHD_create_response_from_callback(MHD_SIZE_UNKNOWN, 1, nothing, nullptr, nullptr);
+  if (response != nullptr)
+    MHD_set_response_options(response, MHD_RF_HTTP_1_0_COMPATIBLE_STRICT, MHD_RO_END);
+  return response;
 }
 
-MHD_Response *WithBody(Response &response, uint64_t &bytes) {
-  if (IsBodiless(response.status)) return WithoutBody();
+/// Whether there is neither a body nor a length of one to be told. The library knows by itself that
+/// 204 has neither.
+bool IsHeadAlone(const Response &response, const std::string &method) {
+  return response.status == 304 || (!HasBody(response, method) && !BodyLength(response));
+}
+
+MHD_Response *WithBody(Response &response, const std::string &method, uint64_t &bytes) {
+  if (IsHeadAlone(response, method)) return WithoutBody();
   if (auto *text = std::get_if<std::string>(&response.body)) return WithText(std::move(*text));
   if (auto *file = std::get_if<FileBody>(&response.body)) return WithFile(*file);
   return WithStream(std::move(std::get<std::unique_ptr<StreamBody>>(response.body)), bytes);
@@ -66,8 +78,9 @@ MHD_Response *WithBody(Response &response, uint64_t &bytes) {
 
 }  // namespace
 
-EmbeddedResponse MakeEmbeddedResponse(Response &response, uint64_t &bytes) {
-  EmbeddedResponse embedded(WithBody(response, bytes), &MHD_destroy_response);
+EmbeddedResponse MakeEmbeddedResponse(Response &response, const std::string &method,
+                                      uint64_t &bytes) {
+  EmbeddedResponse embedded(WithBody(response, method, bytes), &MHD_destroy_response);
   if (embedded == nullptr) return embedded;
   for (const auto &[name, value] : response.headers) {
     if (MHD_add_response_header(embedded.get(), name.c_str(), value.c_str()) != MHD_YES)

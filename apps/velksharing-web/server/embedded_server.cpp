@@ -215,7 +215,8 @@ MHD_Result EmbeddedServerPrivate::Reply(Exchange &exchange, MHD_Connection *conn
     exchange.visit.bytes = BodyLength(response).value_or(0);
   TakeSmallFileIn(response);
   WatchBody(response, connection);
-  const EmbeddedResponse embedded = MakeEmbeddedResponse(response, exchange.visit.bytes);
+  const EmbeddedResponse embedded =
+      MakeEmbeddedResponse(response, exchange.request.method, exchange.visit.bytes);
   if (embedded == nullptr) return MHD_NO;
   return MHD_queue_response(connection, static_cast<unsigned>(response.status), embedded.get());
 }

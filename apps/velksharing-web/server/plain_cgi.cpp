@@ -55,6 +55,8 @@ int ServePlainCgi(Service &service) {
   Visit visit;
   service.Begin();
   CgiRequest cgi = ReadCgiRequest(environ, &ReadInput);
+  // A visitor's field Proxy. Authenticators could take it for the proxy that they are to use.
+  unsetenv("HTTP_PROXY");
   visit.address = cgi.request.remote_address;
   visit.method = cgi.request.method;
   Response response = cgi.refusal == 0 ? service.Answer(cgi.request, visit.note)

@@ -51,7 +51,8 @@ expect_file "$stage"/usr/velk/bin/{velksharingurl,velkwebapi} \
 expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url.conf,pam/velk} \
   "$prefix"/share/doc/velksharing/examples/{sharing-web.conf,nginx/velksharing.conf} \
   "$prefix"/share/doc/velksharing/examples/lighttpd/velksharing{,-cgi}.conf \
-  "$prefix"/share/doc/velksharing/examples/{apache/velksharing.conf,systemd/velksharing-web.service}
+  "$prefix"/share/doc/velksharing/examples/apache/velksharing{,-cgi}.conf \
+  "$prefix"/share/doc/velksharing/examples/systemd/velksharing-web.service
 expect_folder "$stage/usr/velk/etc/private" 750
 expect_folder "$stage/usr/velk/etc/private/session" 750
 
