@@ -197,6 +197,7 @@ void FastCgiServerPrivate::Respond(Channel &channel) {
   if (!channel.IsResponder()) cgi.refusal = 501;
   Response response = cgi.refusal == 0 ? service_.Answer(cgi.request, visit.note)
                                        : service_.Refuse(cgi.request, cgi.refusal);
+  visit.MarkAnswered();
   visit.status = response.status;
   visit.is_whole = Send(response, channel, visit) && channel.Finish();
   if (!visit.is_whole) channel.Cut();

@@ -1,3 +1,4 @@
+#include <fcntl.h>
 #include <malloc.h>
 #include <sys/resource.h>
 #include <syslog.h>
@@ -7,10 +8,12 @@
 #include <cstdlib>
 #include <exception>
 #include <iostream>
+#include <optional>
 
 #include "common/config_file.h"
 #include "server/embedded_server.h"
 #include "server/fastcgi_server.h"
+#include "server/observer.h"
 #include "server/options.h"
 #include "server/plain_cgi.h"
 #include "server/privileges.h"
@@ -18,6 +21,7 @@
 #include "server/service.h"
 #include "server/sockets.h"
 #include "server/supervisor.h"
+#include "watch/watch.h"
 
 namespace {
 
@@ -52,11 +56,19 @@ UniqueFd OpenSocket(const Settings &settings, Mode mode) {
   return Listen(kDefaultListen, access);
 }
 
+/// By paths, only this program's own account may read metrics.
+UniqueFd OpenMetricsSocket(const Settings &settings) {
+  if (settings.metrics_listen.empty()) return UniqueFd();
+  UniqueFd socket = Listen(settings.metrics_listen, {settings.socket_mode, settings.socket_group});
+  syslog(LOG_INFO, "metrics on %s", AddressOf(socket.get()).c_str());
+  return socket;
+}
+
 /// Serves until told to stop, then finishes what runs.
 template <typename Server>
 int Work(UniqueFd &socket, const Settings &settings, const std::string &form_secret,
-         WorkerSignals &signals) {
-  Service service(settings, form_secret);
+         watch::Witness *witness, WorkerSignals &signals) {
+  Service service(settings, form_secret, witness);
   service.Load();
   Server server(socket.get(), settings, service);
   while (signals.Wait() == WorkerSignals::Kind::RELOAD) service.Load();
@@ -72,17 +84,61 @@ int Serve(const Options &options) {
   PrepareSignals();
   RaiseDescriptorLimit();
   UniqueFd socket = OpenSocket(settings, options.mode);
+  UniqueFd metrics_socket = OpenMetricsSocket(settings);
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
   const std::string secret = FormSecret(settings.runtime_folder);
   const bool is_fastcgi = options.mode == Mode::FASTCGI;
   syslog(LOG_INFO, "%s on %s", is_fastcgi ? "FastCGI" : "HTTP", AddressOf(socket.get()).c_str());
   const auto work = is_fastcgi ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
-  return Supervise(
-      settings.workers, std::chrono::seconds(settings.stop_timeout),
-      [&](WorkerSignals &signals) { return work(socket, settings, secret, signals); },
-      // New visitors are turned away at once, and not left waiting for nobody.
-      [&] { socket.Reset(); });
+  std::optional<watch::Watch> watch;
+  if (settings.keeps_audit || metrics_socket.IsOpen()) watch.emplace(settings.keeps_audit);
+  watch::AuditChannel *const channel = watch ? watch->channel() : nullptr;
+
+  Supervision supervision;
+  supervision.workers = settings.workers;
+  supervision.has_observer = watch.has_value();
+  supervision.stop_timeout = std::chrono::seconds(settings.stop_timeout);
+  supervision.work = [&](Task task, WorkerSignals &signals) {
+    if (task == Task::OBSERVE) {
+      socket.Reset();
+      return Observe(settings, std::move(metrics_socket), *watch, signals);
+    }
+    metrics_socket.Reset();
+    if (channel != nullptr) channel->CloseReceiver();
+    return work(socket, settings, secret, watch ? &*watch : nullptr, signals);
+  };
+  supervision.lost = [&](Task task) {
+    if (!watch) return;
+    watch::CounterTable &counters = watch->counters().table();
+    watch::Add(task == Task::WORK ? counters.replaced_workers : counters.replaced_observers);
+  };
+  supervision.stopping = [&] {
+    // New visitors are turned away at once, and not left waiting for nobody.
+    socket.Reset();
+    metrics_socket.Reset();
+    // So that the observer sees when the last worker has ended.
+    if (channel != nullptr) channel->CloseSender();
+  };
+  return Supervise(supervision);
+}
+
+/// What one request by CGI had to say, until its visitor has the answer.
+class Notebook : public watch::Witness {
+ public:
+  void Keep(const audit::Record &record) override { records_.push_back(record); }
+  void Count(const watch::Finished &) override {}
+
+  const std::vector<audit::Record> &records() const { return records_; }
+
+ private:
+  std::vector<audit::Record> records_;
+};
+
+/// The web server takes the answer for whole when the process's output ends.
+void CloseOutput() {
+  const UniqueFd nothing(open("/dev/null", O_WRONLY | O_CLOEXEC));
+  dup2(nothing.get(), STDOUT_FILENO);
 }
 
 /// The command line is left alone: some web servers put words of the address there.
@@ -91,9 +147,14 @@ int ServeOne() {
   PrepareSignals();
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
-  Service service(settings, FormSecret(settings.runtime_folder));
+  Notebook notebook;
+  Service service(settings, FormSecret(settings.runtime_folder),
+                  settings.keeps_audit ? &notebook : nullptr);
   service.Load();
-  return ServePlainCgi(service);
+  const int status = ServePlainCgi(service);
+  CloseOutput();
+  StoreAuditRecords(settings, notebook.records());
+  return status;
 }
 
 /// What only shows when it is used: the site's texts and templates.

@@ -59,6 +59,7 @@ int ServePlainCgi(Service &service) {
   visit.method = cgi.request.method;
   Response response = cgi.refusal == 0 ? service.Answer(cgi.request, visit.note)
                                        : service.Refuse(cgi.request, cgi.refusal);
+  visit.MarkAnswered();
   visit.status = response.status;
   visit.is_whole = Send(response, visit);
   service.End(visit);

@@ -7,6 +7,8 @@
 #include <string_view>
 #include <vector>
 
+#include "watch/shortened_address.h"
+
 namespace web {
 
 /// How the bytes of files reach the visitor under FastCGI.
@@ -36,6 +38,11 @@ struct Settings {
   long retry_after = 600;  ///< In seconds.
 
   std::string access_log = "stderr";  ///< "off", "stderr", "syslog" or an absolute path.
+
+  std::string metrics_listen;  ///< A loopback address or a path, as Listen() takes it; "" for none.
+  bool keeps_audit = false;
+  int audit_retention = 90;  ///< In days.
+  watch::AddressForm audit_address = watch::AddressForm::NETWORK;
 
   FileDelivery file_delivery = FileDelivery::COPY;
   std::vector<std::string> file_folders;  ///< Absolute, without a slash at the end.
