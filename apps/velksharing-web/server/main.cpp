@@ -1,4 +1,3 @@
-#include <fcntl.h>
 #include <malloc.h>
 #include <sys/resource.h>
 #include <syslog.h>
@@ -13,6 +12,7 @@
 #include "common/config_file.h"
 #include "server/embedded_server.h"
 #include "server/fastcgi_server.h"
+#include "server/notebook.h"
 #include "server/observer.h"
 #include "server/options.h"
 #include "server/plain_cgi.h"
@@ -56,7 +56,6 @@ UniqueFd OpenSocket(const Settings &settings, Mode mode) {
   return Listen(kDefaultListen, access);
 }
 
-/// By paths, only this program's own account may read metrics.
 UniqueFd OpenMetricsSocket(const Settings &settings) {
   if (settings.metrics_listen.empty()) return UniqueFd();
   UniqueFd socket = Listen(settings.metrics_listen, {settings.socket_mode, settings.socket_group});
@@ -64,81 +63,81 @@ UniqueFd OpenMetricsSocket(const Settings &settings) {
   return socket;
 }
 
+/// What all processes of a server have from the time before they were forked.
+struct Inheritance {
+  const Settings &settings;
+  UniqueFd socket;
+  UniqueFd metrics_socket;
+  std::string form_secret;
+  std::optional<watch::Watch> watch;  ///< Nothing where nobody observes.
+
+  watch::AuditChannel *channel() { return watch ? watch->channel() : nullptr; }
+};
+
 /// Serves until told to stop, then finishes what runs.
 template <typename Server>
-int Work(UniqueFd &socket, const Settings &settings, const std::string &form_secret,
-         watch::Witness *witness, WorkerSignals &signals) {
-  Service service(settings, form_secret, witness);
+int Work(Inheritance &common, WorkerSignals &signals) {
+  common.metrics_socket.Reset();
+  if (common.channel() != nullptr) common.channel()->CloseReceiver();
+  const Settings &settings = common.settings;
+  Service service(settings, common.form_secret, common.watch ? &*common.watch : nullptr);
   service.Load();
-  Server server(socket.get(), settings, service);
+  Server server(common.socket.get(), settings, service);
   while (signals.Wait() == WorkerSignals::Kind::RELOAD) service.Load();
   service.BeginStop();
   server.StopAccepting();
-  socket.Reset();
+  common.socket.Reset();
   service.WaitUntilIdle(std::chrono::seconds(settings.stop_timeout));
   return service.ExitStatus();
+}
+
+int ObserveWork(Inheritance &common, WorkerSignals &signals) {
+  common.socket.Reset();
+  return Observe(common.settings, std::move(common.metrics_socket), *common.watch, signals);
+}
+
+void CountLost(Inheritance &common, Task task) {
+  if (!common.watch) return;
+  watch::CounterTable &counters = common.watch->counters().table();
+  watch::Add(task == Task::WORK ? counters.replaced_workers : counters.replaced_observers);
+}
+
+void BeginStop(Inheritance &common) {
+  // New visitors are turned away at once, and not left waiting for nobody.
+  common.socket.Reset();
+  common.metrics_socket.Reset();
+  // So that the observer sees when the last worker has ended.
+  if (common.channel() != nullptr) common.channel()->CloseSender();
+}
+
+int SuperviseWork(Inheritance &common, Mode mode) {
+  Supervision supervision;
+  supervision.workers = common.settings.workers;
+  supervision.has_observer = common.watch.has_value();
+  supervision.stop_timeout = std::chrono::seconds(common.settings.stop_timeout);
+  const auto work = mode == Mode::FASTCGI ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
+  supervision.work = [&common, work](Task task, WorkerSignals &signals) {
+    return task == Task::WORK ? work(common, signals) : ObserveWork(common, signals);
+  };
+  supervision.lost = [&common](Task task) { CountLost(common, task); };
+  supervision.stopping = [&common] { BeginStop(common); };
+  return Supervise(supervision);
 }
 
 int Serve(const Options &options) {
   const Settings &settings = options.settings;
   PrepareSignals();
   RaiseDescriptorLimit();
-  UniqueFd socket = OpenSocket(settings, options.mode);
-  UniqueFd metrics_socket = OpenMetricsSocket(settings);
+  Inheritance common{settings, OpenSocket(settings, options.mode), OpenMetricsSocket(settings), "",
+                     std::nullopt};
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
-  const std::string secret = FormSecret(settings.runtime_folder);
-  const bool is_fastcgi = options.mode == Mode::FASTCGI;
-  syslog(LOG_INFO, "%s on %s", is_fastcgi ? "FastCGI" : "HTTP", AddressOf(socket.get()).c_str());
-  const auto work = is_fastcgi ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
-  std::optional<watch::Watch> watch;
-  if (settings.keeps_audit || metrics_socket.IsOpen()) watch.emplace(settings.keeps_audit);
-  watch::AuditChannel *const channel = watch ? watch->channel() : nullptr;
-
-  Supervision supervision;
-  supervision.workers = settings.workers;
-  supervision.has_observer = watch.has_value();
-  supervision.stop_timeout = std::chrono::seconds(settings.stop_timeout);
-  supervision.work = [&](Task task, WorkerSignals &signals) {
-    if (task == Task::OBSERVE) {
-      socket.Reset();
-      return Observe(settings, std::move(metrics_socket), *watch, signals);
-    }
-    metrics_socket.Reset();
-    if (channel != nullptr) channel->CloseReceiver();
-    return work(socket, settings, secret, watch ? &*watch : nullptr, signals);
-  };
-  supervision.lost = [&](Task task) {
-    if (!watch) return;
-    watch::CounterTable &counters = watch->counters().table();
-    watch::Add(task == Task::WORK ? counters.replaced_workers : counters.replaced_observers);
-  };
-  supervision.stopping = [&] {
-    // New visitors are turned away at once, and not left waiting for nobody.
-    socket.Reset();
-    metrics_socket.Reset();
-    // So that the observer sees when the last worker has ended.
-    if (channel != nullptr) channel->CloseSender();
-  };
-  return Supervise(supervision);
-}
-
-/// What one request by CGI had to say, until its visitor has the answer.
-class Notebook : public watch::Witness {
- public:
-  void Keep(const audit::Record &record) override { records_.push_back(record); }
-  void Count(const watch::Finished &) override {}
-
-  const std::vector<audit::Record> &records() const { return records_; }
-
- private:
-  std::vector<audit::Record> records_;
-};
-
-/// The web server takes the answer for whole when the process's output ends.
-void CloseOutput() {
-  const UniqueFd nothing(open("/dev/null", O_WRONLY | O_CLOEXEC));
-  dup2(nothing.get(), STDOUT_FILENO);
+  common.form_secret = FormSecret(settings.runtime_folder);
+  if (settings.keeps_audit || common.metrics_socket.IsOpen())
+    common.watch.emplace(settings.keeps_audit);
+  syslog(LOG_INFO, "%s on %s", options.mode == Mode::FASTCGI ? "FastCGI" : "HTTP",
+         AddressOf(common.socket.get()).c_str());
+  return SuperviseWork(common, options.mode);
 }
 
 /// The command line is left alone: some web servers put words of the address there.
@@ -148,12 +147,10 @@ int ServeOne() {
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
   Notebook notebook;
-  Service service(settings, FormSecret(settings.runtime_folder),
-                  settings.keeps_audit ? &notebook : nullptr);
+  Service service(settings, FormSecret(settings.runtime_folder), &notebook);
   service.Load();
   const int status = ServePlainCgi(service);
-  CloseOutput();
-  StoreAuditRecords(settings, notebook.records());
+  if (settings.keeps_audit) notebook.Store(settings);
   return status;
 }
 

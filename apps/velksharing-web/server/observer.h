@@ -16,9 +16,6 @@ namespace web {
 int Observe(const Settings &settings, UniqueFd metrics_socket, watch::Watch &watch,
             WorkerSignals &signals);
 
-/// Plain CGI: stores what one process had to say. Waits for others who write, and logs a failure.
-void StoreAuditRecords(const Settings &settings, const std::vector<audit::Record> &records);
-
 }  // namespace web
 
 #endif

@@ -259,6 +259,10 @@ Settings ReadSettings(const std::string &file) {
   return settings;
 }
 
+std::chrono::hours AuditRetention(const Settings &settings) {
+  return std::chrono::hours(24) * settings.audit_retention;
+}
+
 void CheckTogether(const Settings &settings) {
   if (!settings.listen.empty() && !settings.fastcgi.empty())
     throw ConfigMistake("listen and fastcgi exclude each other");

@@ -3,6 +3,7 @@
 
 #include <sys/types.h>
 
+#include <chrono>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -62,6 +63,9 @@ void Apply(std::string_view key, std::string_view value, Settings &settings);
 /// Settings of a file; a missing one leaves everything at its default.
 /// @throws velk::ConfigMistake naming file, line and key.
 Settings ReadSettings(const std::string &file);
+
+/// How long records of the audit trail are kept.
+std::chrono::hours AuditRetention(const Settings &settings);
 
 /// What only shows when all settings are known.
 /// @throws velk::ConfigMistake.
