@@ -4,6 +4,7 @@
 import datetime
 import json
 import sqlite3
+import struct
 
 from server_support import *
 
@@ -22,6 +23,21 @@ def remove_trail():
 
 def command_line(*words, **how):
     return subprocess.run([COMMAND_LINE, *words], text=True, capture_output=True, timeout=20, **how)
+
+
+def ask_by_fastcgi(path, uri):
+    """A GET by FastCGI.
+    @return all that comes back."""
+    parameters = {"REQUEST_METHOD": "GET", "REQUEST_URI": uri, "SERVER_PROTOCOL": "HTTP/1.1",
+                  "REMOTE_ADDR": "192.0.2.7"}
+    pairs = b"".join(bytes([len(name), len(value)]) + (name + value).encode()
+                     for name, value in parameters.items())
+    record = lambda kind, content: struct.pack("!BBHHBx", 1, kind, 1, len(content), 0) + content
+    begin = struct.pack("!HB5x", 1, 0)
+    with socket.socket(socket.AF_UNIX) as connection:
+        connection.connect(str(path))
+        connection.sendall(record(1, begin) + record(4, pairs) + record(4, b"") + record(5, b""))
+        return connection.makefile("rb").read()
 
 
 class WatchTest(FrontEndTest):
@@ -152,6 +168,20 @@ class Metrics(WatchTest):
                 self.assertTrue(family.documentation)
                 self.assertTrue(family.name.startswith("velksharing_"))
 
+    def test_everything_is_documented(self):
+        server = self.watch()
+        Visitor(server.port).get("/elsewhere")
+        names = set(re.findall(r"(?m)^# TYPE (\w+) ", self.ask(server).body.decode()))
+        page = (SOURCE / "docs" / "watching.md").read_text()
+        manual = (SOURCE / "docs" / "man" / "velksharing-web.8").read_text()
+        for text in (page, manual):
+            self.assertEqual(names, set(re.findall(r"velksharing_\w+(?<!_bucket)", text)))
+        header = SOURCE / "apps" / "velksharing-web" / "site" / "route_names.h"
+        routes = re.findall(r'"(\w+)"', header.read_text().partition("kRouteNames")[2])
+        self.assertGreater(len(routes), 10)
+        for route in routes:
+            self.assertIn(f"`{route}`", page)
+
     def test_nothing_but_the_metrics_is_served_and_nothing_but_reading(self):
         server = self.watch()
         self.assertEqual(self.ask(server, path="/").status, 404)
@@ -227,6 +257,25 @@ class Metrics(WatchTest):
                      f"metrics_listen={address}"], text=True, capture_output=True, timeout=20)
                 self.assertEqual(outcome.returncode, 2)
                 self.assertIn("metrics_listen: ", outcome.stderr)
+
+    def test_fastcgi_is_watched_too(self):
+        path = self.folder / "fastcgi"
+        server = self.keep(FrontEnd(["--fastcgi", str(path), "--set", "audit=on",
+                                     "--set", "metrics_listen=127.0.0.1:0"], self.folder))
+        link = self.share(self.make_file("photo.jpg", 1000), password=None)
+        answer = ask_by_fastcgi(path, f"/sharing/{link}")
+        self.assertIn(b"photo.jpg", answer)
+        wait_until(lambda: self.metric(server, "velksharing_request_duration_seconds_count",
+                                       route="file") == 1)
+        self.assertEqual(self.wait_for_records(link, 1)[0]["event"], "enter")
+
+    def test_a_reload_changes_nothing(self):
+        server = self.watch()
+        observer = self.observer(server)
+        server.signal(signal.SIGHUP)
+        time.sleep(0.3)
+        self.assertEqual(self.observer(server), observer)
+        self.assertEqual(self.ask(server).status, 200)
 
     def test_it_stops_in_time(self):
         server = self.watch(workers=2)
@@ -319,6 +368,21 @@ class Audit(WatchTest):
         self.assertEqual(names("--since", "1h"), ["WRONG_PASSWORD", "OK"])
         self.assertEqual(len(names("--since", "3h")), 3)
         self.assertEqual(names("--since", "+1h"), [])
+
+    def test_accounts_are_shown_by_name_or_else_by_number(self):
+        server = self.watch()
+        link = self.shared_link()
+        for _ in range(2):
+            Visitor(server.port).log_in(link)
+        self.wait_for_records(link, 2)
+        with sqlite3.connect(TRAIL) as database:
+            database.execute("UPDATE visit SET uid = CASE id WHEN 1 THEN 0 ELSE 3999999999 END")
+        database.close()
+        records = self.visitors_of(link)
+        self.assertEqual([(record["uid"], record["account"]) for record in records],
+                         [(0, "root"), (3999999999, "3999999999")])
+        lines = command_line("link", "log", link).stdout.splitlines()
+        self.assertEqual([line.split()[-1] for line in lines[1:]], ["root", "3999999999"])
 
     def test_a_deleted_link_is_named_by_its_row(self):
         server = self.watch()
