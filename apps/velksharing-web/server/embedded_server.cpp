@@ -173,6 +173,7 @@ MHD_Result EmbeddedServerPrivate::OnRequest(void *self, MHD_Connection *connecti
 
 bool EmbeddedServerPrivate::TakeHead(Exchange &exchange, MHD_Connection *connection,
                                      const char *method, const char *version) {
+  exchange.visit.head = std::chrono::steady_clock::now();
   Request &request = exchange.request;
   request.method = exchange.visit.method = method;
   const std::vector<RawField> fields = FieldsOf(connection);
@@ -210,6 +211,7 @@ MHD_Result EmbeddedServerPrivate::Reply(Exchange &exchange, MHD_Connection *conn
   Response response = exchange.refusal == 0 ? service_.Answer(exchange.request, exchange.visit.note)
                                             : service_.Refuse(exchange.request, exchange.refusal);
   if (exchange.refusal != 0 || service_.IsStopping()) response.headers.Set("Connection", "close");
+  exchange.visit.MarkAnswered();
   exchange.visit.status = response.status;
   if (HasBody(response, exchange.request.method))
     exchange.visit.bytes = BodyLength(response).value_or(0);

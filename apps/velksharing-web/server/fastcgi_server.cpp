@@ -209,6 +209,7 @@ void FastCgiServerPrivate::Respond(Channel &channel) {
   visit.method = cgi.request.method;
   Response response = cgi.refusal == 0 ? service_.Answer(cgi.request, visit.note)
                                        : service_.Refuse(cgi.request, cgi.refusal);
+  visit.MarkAnswered();
   visit.status = response.status;
   visit.is_whole = Send(response, channel, visit) && channel.Finish();
   if (!visit.is_whole) channel.Cut();

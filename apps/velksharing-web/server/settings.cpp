@@ -1,5 +1,6 @@
 #include "server/settings.h"
 
+#include <arpa/inet.h>
 #include <grp.h>
 
 #include <algorithm>
@@ -59,6 +60,13 @@ std::string UrlPath(std::string_view value) {
   return std::string(value);
 }
 
+std::string SocketPath(std::string_view value) {
+  std::string path = AbsolutePath(value);
+  if (path.size() > kLongestSocketPath)
+    throw ConfigMistake("longer than " + std::to_string(kLongestSocketPath) + " bytes");
+  return path;
+}
+
 void SetListen(std::string_view value, Settings &settings) {
   settings.listen = value;
 }
@@ -70,9 +78,7 @@ bool IsOnLoopback(std::string_view value) {
 
 void SetFastCgi(std::string_view value, Settings &settings) {
   // Whoever speaks FastCGI says who the visitor is.
-  settings.fastcgi = IsOnLoopback(value) ? std::string(value) : AbsolutePath(value);
-  if (settings.fastcgi.size() > kLongestSocketPath)
-    throw ConfigMistake("longer than " + std::to_string(kLongestSocketPath) + " bytes");
+  settings.fastcgi = IsOnLoopback(value) ? std::string(value) : SocketPath(value);
 }
 
 void SetSocketMode(std::string_view value, Settings &settings) {
@@ -168,6 +174,50 @@ void SetProtect(std::string_view value, Settings &settings) {
   settings.guarded.push_back({std::move(*prefix), std::string(words[1])});
 }
 
+bool IsLoopback(const std::string &host) {
+  const auto address = velk::ParseAddress(host.c_str());
+  if (!address) return false;
+  if (address->family == AF_INET6) return IN6_IS_ADDR_LOOPBACK(&address->v6);
+  return ntohl(address->v4.s_addr) >> 24 == IN_LOOPBACKNET;
+}
+
+/// No name is taken either: who knows what it means tomorrow.
+void SetMetricsListen(std::string_view value, Settings &settings) {
+  if (value.front() == '/') {
+    settings.metrics_listen = SocketPath(value);
+    return;
+  }
+  const size_t colon = value.rfind(':');
+  if (colon == std::string_view::npos) throw ConfigMistake("neither ADDRESS:PORT nor a path");
+  std::string host(value.substr(0, colon));
+  if (host.starts_with('[') && host.ends_with(']')) host = host.substr(1, host.size() - 2);
+  if (!IsLoopback(host))
+    throw ConfigMistake("metrics are served on loopback addresses and paths only");
+  ConfigNumber(value.substr(colon + 1), 0, 65535);
+  settings.metrics_listen = value;
+}
+
+void SetAudit(std::string_view value, Settings &settings) {
+  if (value != "on" && value != "off") throw ConfigMistake("neither on nor off");
+  settings.keeps_audit = value == "on";
+}
+
+void SetAuditRetention(std::string_view value, Settings &settings) {
+  settings.audit_retention = static_cast<int>(ConfigNumber(value, 1, 3650));
+}
+
+void SetAuditAddress(std::string_view value, Settings &settings) {
+  if (value == "full") {
+    settings.audit_address = watch::AddressForm::FULL;
+  } else if (value == "network") {
+    settings.audit_address = watch::AddressForm::NETWORK;
+  } else if (value == "none") {
+    settings.audit_address = watch::AddressForm::NONE;
+  } else {
+    throw ConfigMistake("none of full, network, none");
+  }
+}
+
 void SetFileDelivery(std::string_view value, Settings &settings) {
   if (value == "copy") {
     settings.file_delivery = FileDelivery::COPY;
@@ -214,6 +264,10 @@ constexpr Key kKeys[] = {
     {kAuthAddress, SetAuthAddress},
     {kProtect, SetProtect},
     {"access_log", SetAccessLog},
+    {"metrics_listen", SetMetricsListen},
+    {"audit", SetAudit},
+    {"audit_retention", SetAuditRetention},
+    {"audit_address", SetAuditAddress},
     {"file_delivery", SetFileDelivery},
     {"file_folders", SetFileFolders},
     {"accel_location", SetAccelLocation},
@@ -239,6 +293,10 @@ Settings ReadSettings(const std::string &file) {
       file, [&](std::string_view key, std::string_view value) { Apply(key, value, settings); },
       {kProtect});
   return settings;
+}
+
+std::chrono::hours AuditRetention(const Settings &settings) {
+  return std::chrono::hours(24) * settings.audit_retention;
 }
 
 void CheckTogether(const Settings &settings) {

@@ -3,11 +3,13 @@
 
 #include <sys/types.h>
 
+#include <chrono>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "gate/guarded_prefix.h"
+#include "watch/shortened_address.h"
 
 namespace web {
 
@@ -51,6 +53,11 @@ struct Settings {
 
   std::string access_log = "stderr";  ///< "off", "stderr", "syslog" or an absolute path.
 
+  std::string metrics_listen;  ///< A loopback address or a path, as Listen() takes it; "" for none.
+  bool keeps_audit = false;
+  int audit_retention = 90;  ///< In days.
+  watch::AddressForm audit_address = watch::AddressForm::NETWORK;
+
   FileDelivery file_delivery = FileDelivery::COPY;
   std::vector<std::string> file_folders;  ///< Absolute, without a slash at the end.
   std::string accel_location = "/velk-files";
@@ -69,6 +76,9 @@ void Apply(std::string_view key, std::string_view value, Settings &settings);
 /// Settings of a file; a missing one leaves everything at its default.
 /// @throws velk::ConfigMistake naming file, line and key.
 Settings ReadSettings(const std::string &file);
+
+/// How long records of the audit trail are kept.
+std::chrono::hours AuditRetention(const Settings &settings);
 
 /// What only shows when all settings are known.
 /// @throws velk::ConfigMistake.

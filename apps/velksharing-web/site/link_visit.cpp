@@ -10,6 +10,7 @@
 #include <utility>
 
 #include "site/access.h"
+#include "site/event_note.h"
 #include "site/result_names.h"
 #include "site/use_lock.h"
 
@@ -84,6 +85,7 @@ Response LinkVisit::LogIn(const Form &form) {
     return Entrance(*link, 403, LoginProblem::kFormExpired, Result{});
   Secret session_id;
   const Result result = Noted(LogInOneByOne(*link, form, session_id.text()));
+  NoteLogin(*link, session_id.text(), note_);
   if (result.code != VELK_SHARING_LOGIN_OK) return RefusedLogin(*link, result, form);
   return Welcome(*link, result, session_id.text());
 }
@@ -92,6 +94,7 @@ Response LinkVisit::LogOut(const Form &form) {
   note_.route = "logout";
   if (!visitor_.HasRightForm(form)) return answers_.Error(403);
   const Result result = Noted(web::LogOut(hash_, visitor_.session_id()));
+  NoteLogout(hash_, visitor_.session_id(), note_);
   Response response = answers_.wants_json()
                           ? answers_.Json(result.code == 1 ? 200 : 401, result)
                           : answers_.SeeOther(address_ + "?" + kFarewellParameter);
@@ -126,6 +129,7 @@ Response LinkVisit::EnterByLooking(Link &link, const SharedRequest &wanted) {
   const Form nothing;
   Secret session_id;
   const Result result = Noted(LogInOneByOne(link, nothing, session_id.text()));
+  NoteLogin(link, session_id.text(), note_);
   if (result.code != VELK_SHARING_LOGIN_OK) return RefusedLogin(link, result, nothing);
   Response response = Show(link, wanted);
   visitor_.KeepSession(response, session_id.text());
