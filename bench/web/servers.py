@@ -4,7 +4,7 @@ import urllib.parse
 
 import apache
 from program import Program, configure, free_port, this_user
-from shared import PAGE_NAME
+from shared import GUARDED, PAGE_NAME
 from subject import Role, Subject
 
 HELLO_WORKERS = 4  # as many as velksharing-web has by itself
@@ -19,12 +19,15 @@ def start_all(running, build, folder, shared):
     hello = running.enter_context(Program(
         [build / 'bin' / 'velksharing_bench_hello', hello_socket, HELLO_WORKERS, shared.page],
         folder / 'hello.output', path=hello_socket))
-    nginx_port = _start_nginx(running, folder / 'nginx', web_socket, hello_socket)
+    nginx, nginx_port = _start_nginx(running, folder / 'nginx', shared, web_socket, hello_socket)
     return [
         *_own_pages('embedded', embedded, embedded_port, shared.link, page),
         *_own_pages('nginx + FastCGI', fastcgi, nginx_port, shared.link, page),
+        _guarded_page(fastcgi, nginx_port, page),
         Subject('hello: nginx + FastCGI', Role.HELLO, f'http://127.0.0.1:{nginx_port}/hello',
                 hello, page, page),
+        Subject('nginx static', Role.STATIC, f'http://127.0.0.1:{nginx_port}/open/{PAGE_NAME}',
+                nginx, page, page),
         apache.start(running, folder / 'apache', shared, Role.APACHE),
         apache.start(running, folder / 'apache-relaxed', shared, Role.APACHE_RELAXED),
     ]
@@ -39,20 +42,21 @@ def _start_embedded(running, build, folder):
 
 def _start_fastcgi(running, build, folder, socket):
     words = [build / 'bin' / 'velksharing-web', '--fastcgi', socket,
-             '--access-log', folder / 'fastcgi.log']
+             '--access-log', folder / 'fastcgi.log', '--set', 'auth_address=parameter']
     return running.enter_context(Program(words, folder / 'fastcgi.output', path=socket))
 
 
-def _start_nginx(running, folder, web_socket, hello_socket):
+def _start_nginx(running, folder, shared, web_socket, hello_socket):
     port = free_port()
     folder.mkdir()
     configuration = configure('nginx.conf', folder, {
         'folder': folder, 'port': port, 'user': this_user(),
-        'web_socket': web_socket, 'hello_socket': hello_socket})
-    running.enter_context(Program(
+        'web_socket': web_socket, 'hello_socket': hello_socket,
+        'files': shared.files, 'guarded': GUARDED})
+    serving = running.enter_context(Program(
         ['nginx', '-p', folder, '-c', configuration, '-e', folder / 'error.log'],
         folder / 'output', port=port))
-    return port
+    return serving, port
 
 
 def _own_pages(how, serving, port, link, page):
@@ -63,3 +67,10 @@ def _own_pages(how, serving, port, link, page):
         Subject(f'{how}: list of the folder', Role.TOLD, f'{entrance}/', serving,
                 PAGE_NAME.encode(), entrance=entrance),
     ]
+
+
+def _guarded_page(serving, port, page):
+    """Who is not let in is led to a login, and back."""
+    address = f'http://127.0.0.1:{port}{GUARDED}{PAGE_NAME}'
+    return Subject('nginx + auth_request', Role.GATE, address, serving, page, page,
+                   entrance=address)
