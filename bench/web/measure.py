@@ -5,6 +5,7 @@ how. script/bench web builds what it needs and calls it."""
 import argparse
 import contextlib
 import random
+import re
 import sys
 from pathlib import Path
 
@@ -26,6 +27,8 @@ def options():
     parser.add_argument('--rounds', type=_positive, default=5)
     parser.add_argument('--seconds', type=_positive, default=3, help='of each measurement')
     parser.add_argument('--links', type=_positive, default=100_000, help='in the database')
+    parser.add_argument('--rows', type=_pattern, default='', metavar='REGEX',
+                        help='only those whose name it is found in')
     chosen = parser.parse_args()
     if chosen.quick:
         chosen.rounds, chosen.seconds, chosen.links = 1, 1, 1000
@@ -39,14 +42,18 @@ def main():
     folder = chosen.build.resolve() / 'web-bench'
     with Shared(chosen.build.resolve(), folder, chosen.links) as shared, \
             contextlib.ExitStack() as running:
-        subjects = servers.start_all(running, chosen.build.resolve(), folder, shared)
+        subjects = [subject for subject in
+                    servers.start_all(running, chosen.build.resolve(), folder, shared)
+                    if chosen.rows.search(subject.name)]
+        if not subjects:
+            raise RuntimeError(f'no row has a name with "{chosen.rows.pattern}" in it')
         for subject in subjects:
             subject.admit(VISITORS, shared.credentials)
         rounds = [measure_round(subjects, folder, chosen) for _ in range(chosen.rounds)]
         for subject in subjects:
             subject.check_visitors()
     finished = report.Report(rounds)
-    print(finished.measurements(), finished.targets(), sep='\n\n')
+    print(*finished.tables(), sep='\n\n')
     return 1 if finished.errors() > 0 else 0
 
 
@@ -67,6 +74,13 @@ def _positive(text):
     if number < 1:
         raise argparse.ArgumentTypeError('takes a number above 0')
     return number
+
+
+def _pattern(text):
+    try:
+        return re.compile(text)
+    except re.error as error:
+        raise argparse.ArgumentTypeError(f'is no regular expression: {error}') from error
 
 
 if __name__ == '__main__':

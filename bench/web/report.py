@@ -10,8 +10,12 @@ from program import run
 from subject import Role
 
 HEADS = ['server', 'conc.', 'requests/s (min–max)', 'p50 ms', 'p99 ms', 'CPU µs', 'errors', 'RSS MB',
-         'PSS MB', '× Apache', '× Apache relaxed', '× hello']
-WANTED_RATIOS = {Role.APACHE: 1.5, Role.APACHE_RELAXED: 1.5, Role.HELLO: 0.25}
+         'PSS MB']
+OTHERS = (Role.APACHE, Role.APACHE_RELAXED, Role.HELLO, Role.STATIC)
+WANTED_RATIOS = {
+    Role.CHECKED: {Role.APACHE: 1.5, Role.APACHE_RELAXED: 1.5, Role.HELLO: 0.25},
+    Role.GATE: {Role.APACHE: 1.5},
+}
 CROWD = 8            # visitors at once, of the target for p99
 LONGEST_P99 = 20     # ms
 LARGEST_WORKER = 25  # MB
@@ -38,19 +42,15 @@ class Report:
     def errors(self):
         return sum(measured.errors for each in self._rounds for measured in each.values())
 
-    def measurements(self):
-        """The table of all figures."""
+    def tables(self):
+        """All figures, and what is to be reached by them."""
         rows = [self._row(subject, concurrency)
                 for subject in self._subjects for concurrency in self._concurrencies]
-        return _table(HEADS, rows)
-
-    def targets(self):
-        """The table of what is to be reached."""
-        rows = []
-        for subject in self._subjects:
-            if subject.role is Role.CHECKED:
-                rows += self._targets_of(subject)
-        return _table(['target', 'wanted', 'reached (min–max)', 'enough'], rows)
+        tables = [_table([*HEADS, *(f'× {role.value}' for role in OTHERS)], rows)]
+        targets = [target for subject in self._subjects for target in self._targets_of(subject)]
+        if targets:
+            tables.append(_table(['target', 'wanted', 'reached (min–max)', 'enough'], targets))
+        return tables
 
     def _row(self, subject, concurrency):
         def median(figure):
@@ -61,35 +61,55 @@ class Report:
                 median('p50'), median('p99'), median('processor'),
                 str(sum(self._figures(subject, concurrency, 'errors'))),
                 median('resident'), median('proportional'),
-                *(_ratio(statistics.median(self._ratios(subject, concurrency, role)))
-                  for role in WANTED_RATIOS)]
+                *(self._times(subject, concurrency, role) for role in OTHERS)]
 
     def _targets_of(self, subject):
+        rows = self._target_ratios(subject)
+        if subject.role is Role.CHECKED:
+            rows += [self._target_p99(subject), self._target_memory(subject)]
+        return rows
+
+    def _target_ratios(self, subject):
         rows = []
-        for role, wanted in WANTED_RATIOS.items():
+        for role, wanted in WANTED_RATIOS.get(subject.role, {}).items():
+            other = self._other(role)
+            if other is None:
+                continue
             for concurrency in self._concurrencies:
-                ratios = self._ratios(subject, concurrency, role)
+                ratios = self._ratios(subject, concurrency, other)
                 rows.append([f'{subject.name}: × {role.value} at {concurrency}', f'≥ {wanted}',
                              _spread(ratios, _ratio),
                              _yes_or_no(statistics.median(ratios) >= wanted)])
+        return rows
+
+    def _target_p99(self, subject):
         p99 = self._figures(subject, CROWD, 'p99')
-        rows.append([f'{subject.name}: p99 at {CROWD}, ms', f'≤ {LONGEST_P99}',
-                     _spread(p99, _number), _yes_or_no(statistics.median(p99) <= LONGEST_P99)])
+        return [f'{subject.name}: p99 at {CROWD}, ms', f'≤ {LONGEST_P99}',
+                _spread(p99, _number), _yes_or_no(statistics.median(p99) <= LONGEST_P99)]
+
+    def _target_memory(self, subject):
         largest = max(max(self._figures(measured, concurrency, 'resident'))
                       for measured in self._subjects if measured.serving is subject.serving
                       for concurrency in self._concurrencies)
-        rows.append([f'{subject.name}: RSS of the largest worker in all rounds, MB',
-                     f'≤ {LARGEST_WORKER}', _number(largest),
-                     _yes_or_no(largest <= LARGEST_WORKER)])
-        return rows
+        return [f'{subject.name}: RSS of the largest worker in all rounds, MB',
+                f'≤ {LARGEST_WORKER}', _number(largest), _yes_or_no(largest <= LARGEST_WORKER)]
 
     def _figures(self, subject, concurrency, figure):
         """Of all rounds."""
         return [getattr(each[subject, concurrency], figure) for each in self._rounds]
 
-    def _ratios(self, subject, concurrency, role):
+    def _times(self, subject, concurrency, role):
+        other = self._other(role)
+        if other is None:
+            return ''
+        return _ratio(statistics.median(self._ratios(subject, concurrency, other)))
+
+    def _other(self, role):
+        """None when it was not measured."""
+        return next((subject for subject in self._subjects if subject.role is role), None)
+
+    def _ratios(self, subject, concurrency, other):
         """Times the requests per second of the other one in the same round."""
-        other = next(subject for subject in self._subjects if subject.role is role)
         return [ours / theirs for ours, theirs in zip(
             self._figures(subject, concurrency, 'requests_per_second'),
             self._figures(other, concurrency, 'requests_per_second'))]

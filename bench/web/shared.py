@@ -1,5 +1,7 @@
-"""What is looked at: a small file in a folder, shared by a link among many others."""
+"""What is looked at: a small file in a folder, shared by a link among many others, and guarded by
+another."""
 
+import json
 import os
 import secrets
 import shutil
@@ -11,10 +13,12 @@ from subject import Credentials
 PAGE_NAME = 'page.txt'
 PAGE_BYTES = 1024
 OTHER_FILES = ('second page.txt', 'third page.txt')
+GUARDED = '/guarded/'  # where nginx has the file for those alone whom a link lets in
+OTHER_GUARDS = 20      # links that guard something else
 
 
 class Shared:
-    """Makes the database and the link; at the end of the block both are gone."""
+    """Makes the database and the links; at the end of the block they are gone."""
 
     def __init__(self, build, folder, links):
         self._programs = build / 'bin'
@@ -24,7 +28,7 @@ class Shared:
         self.credentials = Credentials('visitor', secrets.token_urlsafe(12))
         self.files = folder / 'shared'
         self.page = self.files / PAGE_NAME
-        self.link = None  # its hash
+        self.link = None  # the hash of that which shares the folder
 
     def __enter__(self):
         try:
@@ -46,16 +50,28 @@ class Shared:
         for name in (PAGE_NAME, *OTHER_FILES):
             (self.files / name).write_text(_text())
         self._database = program.run([self._programs / 'velksharing_bench_links', self.links])
-        self.link = self._make_link()
+        self._write_password()
+        self.link = self._make_link('--path', self.files)
+        self._make_guard(GUARDED)
+        for number in range(OTHER_GUARDS):
+            self._make_guard(f'https://site{number}.example/', f'/other/{number}/')
 
-    def _make_link(self):
-        secret = self._folder / 'password'
-        with open(os.open(secret, os.O_WRONLY | os.O_CREAT, 0o600), 'w') as file:
+    def _write_password(self):
+        with open(os.open(self._password_file(), os.O_WRONLY | os.O_CREAT, 0o600), 'w') as file:
             file.write(self.credentials.password + '\n')
+
+    def _password_file(self):
+        return self._folder / 'password'
+
+    def _make_guard(self, *prefixes):
+        self._make_link('--app', json.dumps({'protects': prefixes}))
+
+    def _make_link(self, *content):
+        """Returns its hash."""
         return program.run([
             self._programs / 'velksharing', 'link', 'create', '--project', 'files',
-            '--owner', program.plain_user(), '--path', self.files, '--title', 'Pages',
-            '--password-file', secret])
+            '--owner', program.plain_user(), '--title', 'Pages',
+            '--password-file', self._password_file(), *content])
 
 
 def _text():

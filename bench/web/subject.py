@@ -13,9 +13,11 @@ class Role(enum.Enum):
 
     CHECKED = 'ours, and what the targets are about'
     TOLD = 'ours, too, but does more than the others'
+    GATE = 'of a server that asks us'
     HELLO = 'hello'
     APACHE = 'Apache'
     APACHE_RELAXED = 'Apache relaxed'
+    STATIC = 'nginx static'
 
 
 @dataclass(frozen=True)
