@@ -1,10 +1,8 @@
 #include "site/redirect_target.h"
 
-#include <arpa/inet.h>
-
 #include <algorithm>
-#include <string>
 
+#include "http/host.h"
 #include "http/text.h"
 
 namespace web {
@@ -19,58 +17,9 @@ bool TakePrefix(std::string_view &text, std::string_view prefix) {
   return true;
 }
 
-bool IsLabel(std::string_view label) {
-  return !label.empty() && label.size() <= 63 && label.front() != '-' && label.back() != '-' &&
-         std::ranges::all_of(
-             label, [](char byte) { return IsLetterOrDigit(byte) || byte == '-' || byte == '_'; });
-}
-
-bool IsHostName(std::string_view host) {
-  if (host.size() > 253) return false;
-  for (;;) {
-    const size_t dot = host.find('.');
-    if (!IsLabel(host.substr(0, dot))) return false;
-    if (dot == std::string_view::npos) break;
-    host.remove_prefix(dot + 1);
-  }
-  return true;
-}
-
-/// Browsers read a host whose last label begins with a digit as an IPv4 address in one of many
-/// spellings; only the usual one is taken.
-bool LooksLikeIPv4(std::string_view host) {
-  const size_t dot = host.rfind('.');
-  return IsDigit(host[dot == std::string_view::npos ? 0 : dot + 1]);
-}
-
-bool IsIPv4(std::string_view host) {
-  in_addr address;
-  return inet_pton(AF_INET, std::string(host).c_str(), &address) == 1;
-}
-
-bool IsBracketedIPv6(std::string_view host) {
-  if (host.size() < 2 || host.front() != '[' || host.back() != ']') return false;
-  in6_addr address;
-  return inet_pton(AF_INET6, std::string(host.substr(1, host.size() - 2)).c_str(), &address) == 1;
-}
-
-bool IsHost(std::string_view host) {
-  if (IsBracketedIPv6(host)) return true;
-  if (!IsHostName(host)) return false;
-  return !LooksLikeIPv4(host) || IsIPv4(host);
-}
-
-bool IsPort(std::string_view port) {
-  if (port.empty() || port.size() > 5 || !std::ranges::all_of(port, IsDigit)) return false;
-  const int number = std::stoi(std::string(port));
-  return number >= 1 && number <= 65535;
-}
-
 bool IsAuthority(std::string_view authority) {
-  const size_t bracket = authority.rfind(']');
-  const size_t colon = authority.find(':', bracket == std::string_view::npos ? 0 : bracket);
-  if (colon == std::string_view::npos) return IsHost(authority);
-  return IsHost(authority.substr(0, colon)) && IsPort(authority.substr(colon + 1));
+  const HostAndPort parts = SplitHostAndPort(authority);
+  return IsHost(parts.host) && (!parts.port || PortNumber(*parts.port));
 }
 
 /// Path, query and fragment: the characters of RFC 3986, and escapes that are whole.
