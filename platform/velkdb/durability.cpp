@@ -10,7 +10,9 @@
 namespace velkdb {
 namespace {
 
-constexpr int kFramesToCheckpoint = 1000;  // what SQLite's own hook, replaced by ours, takes
+// SQLite's own hook, replaced by ours, takes 1000. A checkpoint waits for the disk twice, and
+// writes a page once that was changed many times: sessions and grants change at each check.
+constexpr int kFramesToCheckpoint = 1000;
 constexpr char kListTable[] = "velkdb_relaxed";
 
 bool SameName(const char *a, const char *b) {
@@ -25,9 +27,10 @@ Effect EffectOf(const Durability &durability, int action, const char *first, con
     case SQLITE_READ:
     case SQLITE_FUNCTION:
     case SQLITE_RECURSIVE:
+      return Effect::kNone;
     case SQLITE_TRANSACTION:
     case SQLITE_SAVEPOINT:
-      return Effect::kNone;
+      return Effect::kTransaction;
     case SQLITE_PRAGMA:  // the second is its argument
       return second == nullptr ? Effect::kNone : Effect::kStructure;
     case SQLITE_INSERT:
@@ -120,10 +123,18 @@ int Durability::Committed(const char *database, int frames) {
   // A statement that SQLite prepared anew while stepping may write more than it was seen to.
   const Effect effect = std::max(transaction_, seen_);
   const int flushed = effect > Effect::kRelaxedRows ? FlushLog(connection_, database) : SQLITE_OK;
-  // A checkpoint that cannot be made now is made at a later commit.
-  if (frames >= kFramesToCheckpoint)
+  if (IsTimeToCheckpoint(frames))
     sqlite3_wal_checkpoint_v2(connection_, database, SQLITE_CHECKPOINT_PASSIVE, nullptr, nullptr);
   return flushed;
+}
+
+// One that cannot be made now, or not of everything, is tried again much later, and not at each
+// commit until the log begins anew: each try waits for the disk.
+bool Durability::IsTimeToCheckpoint(int frames) {
+  if (frames < kFramesToCheckpoint) next_checkpoint_ = kFramesToCheckpoint;
+  if (frames < next_checkpoint_) return false;
+  next_checkpoint_ = frames + kFramesToCheckpoint;
+  return true;
 }
 
 bool Durability::IsRelaxed(const char *database, const char *table) const {

@@ -11,6 +11,7 @@ namespace velkdb {
 /// What a statement, or a transaction as a whole, writes. Each value outweighs those before it.
 enum class Effect {
   kNone,         ///< Nothing.
+  kTransaction,  ///< Nothing itself, but begins a transaction that will.
   kRelaxedRows,  ///< INSERTs and UPDATEs of relaxed tables alone.
   kRows,         ///< Rows of other tables, or rows deleted.
   kStructure,    ///< Tables, settings, the list of relaxed tables itself.
@@ -59,8 +60,11 @@ class Durability {
   bool IsRelaxed(const char *database, const char *table) const;
 
  private:
+  bool IsTimeToCheckpoint(int frames);
+
   sqlite3 *connection_ = nullptr;
   std::vector<std::string> relaxed_;
+  int next_checkpoint_ = 0;             ///< Frames in the log at which another one is tried.
   bool current_ = false;                ///< Refresh() has nothing to do.
   Effect seen_ = Effect::kNone;         ///< Of the statement being prepared, or prepared anew.
   Effect transaction_ = Effect::kNone;  ///< Of the transaction so far.

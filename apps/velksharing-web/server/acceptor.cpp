@@ -1,7 +1,5 @@
 #include "server/acceptor.h"
 
-#include <poll.h>
-#include <sys/eventfd.h>
 #include <syslog.h>
 
 #include <cerrno>
@@ -18,7 +16,7 @@ constexpr std::chrono::milliseconds kBreath{100};
 Acceptor::Acceptor(int listening_socket, int room, Taker take)
     : listening_socket_(listening_socket),
       take_(std::move(take)),
-      stop_(eventfd(0, EFD_CLOEXEC)),
+      wait_(listening_socket),
       room_(room) {}
 
 Acceptor::~Acceptor() {
@@ -41,25 +39,18 @@ void Acceptor::Stop() {
     is_stopping_ = true;
   }
   changed_.notify_all();
-  eventfd_write(stop_.get(), 1);
+  wait_.Stop();
   if (thread_.joinable()) thread_.join();
 }
 
 void Acceptor::Run() {
-  while (WaitForRoom() && WaitForConnection()) AcceptOne();
+  while (WaitForRoom() && wait_.Wait()) AcceptOne();
 }
 
 bool Acceptor::WaitForRoom() {
   std::unique_lock lock(mutex_);
   changed_.wait(lock, [this] { return is_stopping_ || room_ > 0; });
   return !is_stopping_;
-}
-
-bool Acceptor::WaitForConnection() const {
-  pollfd watched[] = {{stop_.get(), POLLIN, 0}, {listening_socket_, POLLIN, 0}};
-  while (poll(watched, 2, -1) < 0 && errno == EINTR) {
-  }
-  return watched[0].revents == 0;
 }
 
 void Acceptor::AcceptOne() {

@@ -9,6 +9,7 @@
 #include <thread>
 
 #include "http/unique_fd.h"
+#include "server/listening_wait.h"
 
 namespace web {
 
@@ -36,12 +37,11 @@ class Acceptor {
  private:
   void Run();
   bool WaitForRoom();
-  bool WaitForConnection() const;
   void AcceptOne();
 
   const int listening_socket_;
   const Taker take_;
-  UniqueFd stop_;  ///< Readable when no more are to be taken.
+  ListeningWait wait_;
   std::mutex mutex_;
   std::condition_variable changed_;
   int room_;

@@ -55,4 +55,12 @@ Copied CopyBody(Response &response, const Sink &sink) {
   return CopyStream(*std::get<std::unique_ptr<StreamBody>>(response.body), sink);
 }
 
+void TakeSmallFileIn(Response &response) {
+  const auto *file = std::get_if<FileBody>(&response.body);
+  if (file == nullptr || file->length > static_cast<off_t>(kPiece)) return;
+  std::string bytes(static_cast<size_t>(file->length), '\0');
+  if (ReadAt(file->file.get(), bytes.data(), bytes.size(), file->offset) == file->length)
+    response.body = std::move(bytes);
+}
+
 }  // namespace web

@@ -19,6 +19,10 @@ struct Copied {
 /// Hands a body over, piece by piece.
 Copied CopyBody(Response &response, const Sink &sink);
 
+/// Puts a small file's bytes in the place of the file: so they leave together with the head. One
+/// that cannot be read whole stays as it is.
+void TakeSmallFileIn(Response &response);
+
 }  // namespace web
 
 #endif

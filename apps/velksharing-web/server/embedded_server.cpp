@@ -8,6 +8,7 @@
 
 #include "server/acceptor.h"
 #include "server/answer_head.h"
+#include "server/body_copy.h"
 #include "server/connection_watch.h"
 #include "server/embedded_response.h"
 #include "server/limits.h"
@@ -208,6 +209,7 @@ MHD_Result EmbeddedServerPrivate::Reply(Exchange &exchange, MHD_Connection *conn
   exchange.visit.status = response.status;
   if (HasBody(response, exchange.request.method))
     exchange.visit.bytes = BodyLength(response).value_or(0);
+  TakeSmallFileIn(response);
   WatchBody(response, connection);
   const EmbeddedResponse embedded =
       MakeEmbeddedResponse(response, exchange.request.method, exchange.visit.bytes);

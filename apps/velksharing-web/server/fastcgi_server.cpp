@@ -2,7 +2,6 @@
 
 #include <fcgiapp.h>
 #include <poll.h>
-#include <sys/eventfd.h>
 #include <sys/socket.h>
 
 #include <atomic>
@@ -18,6 +17,7 @@
 #include "server/cgi_request.h"
 #include "server/file_offload.h"
 #include "server/limits.h"
+#include "server/listening_wait.h"
 
 namespace web {
 namespace {
@@ -95,7 +95,7 @@ class FastCgiServerPrivate {
   FastCgiServerPrivate(int listening_socket, const Settings &settings, Service &service);
   ~FastCgiServerPrivate();
 
-  void StopAccepting() { eventfd_write(stop_.get(), 1); }
+  void StopAccepting() { wait_.Stop(); }
 
  private:
   void Serve(std::atomic<int> &connection);
@@ -111,7 +111,7 @@ class FastCgiServerPrivate {
   const int listening_socket_;
   const FileOffload offload_;
   Service &service_;
-  UniqueFd stop_;  ///< Readable when no more requests are to be taken.
+  ListeningWait wait_;
   std::mutex accepting_;
   std::atomic<int> free_threads_ = 0;          ///< Waiting for new connections.
   std::vector<std::atomic<int>> connections_;  ///< Of each thread; -1 for none.
@@ -123,9 +123,9 @@ FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings 
     : listening_socket_(listening_socket),
       offload_(settings),
       service_(service),
-      stop_(eventfd(0, EFD_CLOEXEC)),
+      wait_(listening_socket),
       connections_(static_cast<size_t>(settings.threads)) {
-  if (!stop_.IsOpen() || FCGX_Init() != 0) throw std::runtime_error("FastCGI does not start");
+  if (FCGX_Init() != 0) throw std::runtime_error("FastCGI does not start");
   for (std::atomic<int> &connection : connections_) {
     connection = -1;
     threads_.emplace_back([this, &connection] { Serve(connection); });
@@ -160,10 +160,9 @@ UniqueFd FastCgiServerPrivate::AcceptConnection() {
   ++free_threads_;
   // One thread at a time looks at the socket, or a request would wake them all.
   const std::lock_guard guard(accepting_);
-  pollfd watched[] = {{stop_.get(), POLLIN, 0}, {listening_socket_, POLLIN, 0}};
-  poll(watched, 2, -1);
+  const bool is_there = wait_.Wait();
   --free_threads_;
-  if (IsReady(watched[0])) return UniqueFd();
+  if (!is_there) return UniqueFd();
   return UniqueFd(accept4(listening_socket_, nullptr, nullptr, SOCK_CLOEXEC));
 }
 
@@ -175,14 +174,14 @@ bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {
 }
 
 bool FastCgiServerPrivate::WaitForKept(Channel &channel) {
-  pollfd watched[] = {{stop_.get(), POLLIN, 0}, {channel.connection(), POLLIN, 0}};
+  pollfd watched[] = {{wait_.stop_descriptor(), POLLIN, 0}, {channel.connection(), POLLIN, 0}};
   const int ready = poll(watched, 2, kLookAround);
   if (ready == 0 && free_threads_ == 0) channel.Cut();
   return ready > 0 && !IsReady(watched[0]);
 }
 
 bool FastCgiServerPrivate::IsStopped() const {
-  pollfd watched = {stop_.get(), POLLIN, 0};
+  pollfd watched = {wait_.stop_descriptor(), POLLIN, 0};
   return poll(&watched, 1, 0) > 0;
 }
 

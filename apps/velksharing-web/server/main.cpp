@@ -18,6 +18,7 @@
 #include "server/service.h"
 #include "server/sockets.h"
 #include "server/supervisor.h"
+#include "site/turn.h"
 
 namespace {
 
@@ -75,6 +76,7 @@ int Serve(const Options &options) {
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
   const std::string secret = FormSecret(settings.runtime_folder);
+  ShareTurns();
   const bool is_fastcgi = options.mode == Mode::FASTCGI;
   syslog(LOG_INFO, "%s on %s", is_fastcgi ? "FastCGI" : "HTTP", AddressOf(socket.get()).c_str());
   const auto work = is_fastcgi ? &Work<FastCgiServer> : &Work<EmbeddedServer>;

@@ -25,6 +25,9 @@ constexpr uint64_t Bit(int capability) {
 constexpr uint64_t kSwitching = Bit(CAP_SETUID) | Bit(CAP_SETGID);
 constexpr uint64_t kPastPermissions = Bit(CAP_DAC_OVERRIDE) | Bit(CAP_DAC_READ_SEARCH) |
                                       Bit(CAP_FOWNER) | Bit(CAP_CHOWN) | Bit(CAP_MAC_OVERRIDE);
+// What the kernel takes away or brings back when a file-system user id changes from or to root's.
+constexpr uint64_t kTiedToRoot =
+    kPastPermissions | Bit(CAP_MKNOD) | Bit(CAP_FSETID) | Bit(CAP_LINUX_IMMUTABLE);
 
 struct CapabilitySets {
   __user_cap_header_struct header = {_LINUX_CAPABILITY_VERSION_3, 0};
@@ -35,10 +38,16 @@ bool Get(CapabilitySets &sets) {
   return syscall(SYS_capget, &sets.header, sets.data) == 0;
 }
 
+uint64_t Effective(const CapabilitySets &sets) {
+  return uint64_t{sets.data[1].effective} << 32 | sets.data[0].effective;
+}
+uint64_t Permitted(const CapabilitySets &sets) {
+  return uint64_t{sets.data[1].permitted} << 32 | sets.data[0].permitted;
+}
+
 uint64_t EffectiveCapabilities() {
   CapabilitySets sets;
-  if (!Get(sets)) return 0;
-  return uint64_t{sets.data[1].effective} << 32 | sets.data[0].effective;
+  return Get(sets) ? Effective(sets) : 0;
 }
 
 bool SetEffectiveCapabilities(uint64_t capabilities) {
@@ -60,6 +69,10 @@ bool SetGroups(const std::vector<gid_t> &groups) {
 }
 
 std::vector<gid_t> Groups() {
+  constexpr int kUsual = 32;
+  gid_t usual[kUsual];
+  const int few = getgroups(kUsual, usual);
+  if (few >= 0) return {usual, usual + few};
   const int count = getgroups(0, nullptr);
   std::vector<gid_t> groups(count > 0 ? static_cast<size_t>(count) : 0);
   if (!groups.empty() && getgroups(count, groups.data()) != count) groups.clear();
@@ -83,11 +96,10 @@ bool SetFileGid(gid_t gid) {
   return FileGid() == gid;
 }
 
-// The capabilities come last: a user id that changes from or to root's takes some away or brings
-// them back, and a process that is not root keeps what it should not have.
-bool SetFileRights(const FileRights &rights) {
-  return SetGroups(rights.groups) && SetFileGid(rights.gid) && SetFileUid(rights.uid) &&
-         SetEffectiveCapabilities(rights.capabilities);
+/// Changes what differs. These calls are most of what a small request costs the kernel.
+bool ChangeIds(const FileRights &from, const FileRights &to) {
+  return (from.groups == to.groups || SetGroups(to.groups)) &&
+         (from.gid == to.gid || SetFileGid(to.gid)) && (from.uid == to.uid || SetFileUid(to.uid));
 }
 
 FileRights RightsOf(const Owner &owner, const FileRights &current) {
@@ -105,7 +117,8 @@ bool MaySwitchFileRights() {
 }
 
 OwnerScope::OwnerScope(const Owner &owner) {
-  if (!MaySwitchFileRights()) {
+  CapabilitySets sets;
+  if (!Get(sets) || (Effective(sets) & kSwitching) != kSwitching) {
     is_entered_ = true;
     return;
   }
@@ -113,10 +126,12 @@ OwnerScope::OwnerScope(const Owner &owner) {
     syslog(LOG_NOTICE, "nothing is opened as root: a link of root is not served");
     return;
   }
-  saved_ = CurrentFileRights();
+  saved_ = {FileUid(), FileGid(), Groups(), Effective(sets)};
+  taken_ = RightsOf(owner, saved_);
+  changes_capabilities_ = ((Effective(sets) | Permitted(sets)) & kTiedToRoot) != 0;
   prctl(PR_GET_PDEATHSIG, &saved_death_signal_);
   is_switched_ = true;
-  is_entered_ = SetFileRights(RightsOf(owner, saved_));
+  is_entered_ = Change(saved_, taken_);
   if (is_entered_) return;
   syslog(LOG_ERR, "cannot take on the file rights of user %u", owner.uid);
   Leave();
@@ -130,8 +145,16 @@ OwnerScope::~OwnerScope() {
   errno = callers_errno;
 }
 
+// The capabilities come last: a user id that changes from or to root's takes some away or brings
+// them back, and a process that is not root keeps what it should not have.
+bool OwnerScope::Change(const FileRights &from, const FileRights &to) const {
+  return ChangeIds(from, to) &&
+         (!changes_capabilities_ || SetEffectiveCapabilities(to.capabilities));
+}
+
+// Where entering failed half-way, what differs is what may have changed.
 void OwnerScope::Leave() const {
-  if (!SetFileRights(saved_)) {
+  if (!Change(taken_, saved_)) {
     syslog(LOG_CRIT, "cannot get back from another user's file rights; this process ends");
     abort();
   }

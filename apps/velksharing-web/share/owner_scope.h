@@ -49,9 +49,12 @@ class OwnerScope {
   bool IsEntered() const { return is_entered_; }
 
  private:
+  bool Change(const FileRights &from, const FileRights &to) const;
   void Leave() const;
 
   FileRights saved_;
+  FileRights taken_;
+  bool changes_capabilities_ = false;
   int saved_death_signal_ = 0;
   bool is_switched_ = false;
   bool is_entered_ = false;

@@ -30,6 +30,17 @@ void LogUnusable(const std::string &path, uid_t owner, const char *reason) {
   syslog(LOG_NOTICE, "cannot serve “%s” of user %u: %s", Readable(path).c_str(), owner, reason);
 }
 
+/// The account whose rights apply to a path that a link names.
+std::optional<Owner> OwnerOf(const std::string &path, uid_t owner) {
+  if (!IsUsablePath(path)) {
+    LogUnusable(path, owner, "no absolute path");
+    return std::nullopt;
+  }
+  std::optional<Owner> account = FindOwner(owner);
+  if (!account) LogUnusable(path, owner, "there is no such account");
+  return account;
+}
+
 // What a link names is open already, if it is a file; folders are opened anew, because reading one
 // moves the descriptor on.
 UniqueFd Reopen(const TreeRoot &root, const std::vector<std::string> &parts) {
@@ -44,28 +55,37 @@ UniqueFd Reopen(const TreeRoot &root, const std::vector<std::string> &parts) {
 SharedTree::SharedTree(std::shared_ptr<const TreeRoot> root) : root_(std::move(root)) {}
 
 std::optional<SharedTree> SharedTree::Open(const std::string &path, uid_t owner) {
-  if (!IsUsablePath(path)) {
-    LogUnusable(path, owner, "no absolute path");
-    return std::nullopt;
-  }
-  auto root = std::make_shared<TreeRoot>();
-  std::optional<Owner> account = FindOwner(owner);
-  if (!account) {
-    LogUnusable(path, owner, "there is no such account");
-    return std::nullopt;
-  }
-  root->owner = std::move(*account);
-  const OwnerScope as_owner(root->owner);
+  const std::optional<Owner> account = OwnerOf(path, owner);
+  if (!account) return std::nullopt;
+  const OwnerScope as_owner(*account);
   if (!as_owner.IsEntered()) return std::nullopt;
+  return OpenEntered(path, *account);
+}
 
+std::optional<SharedTree> SharedTree::Open(const std::string &path, uid_t owner,
+                                           const std::vector<std::string> &parts,
+                                           std::optional<Item> &item) {
+  item.reset();
+  const std::optional<Owner> account = OwnerOf(path, owner);
+  if (!account) return std::nullopt;
+  const OwnerScope as_owner(*account);
+  if (!as_owner.IsEntered()) return std::nullopt;
+  std::optional<SharedTree> tree = OpenEntered(path, *account);
+  if (tree) item = tree->FindEntered(parts);
+  return tree;
+}
+
+std::optional<SharedTree> SharedTree::OpenEntered(const std::string &path, const Owner &owner) {
+  auto root = std::make_shared<TreeRoot>();
+  root->owner = owner;
   root->file = OpenAbsolute(path);
   if (!root->file.IsOpen()) {
-    LogUnusable(path, owner, strerror(errno));
+    LogUnusable(path, owner.uid, strerror(errno));
     return std::nullopt;
   }
   const std::optional<struct stat> status = StatServed(root->file);
   if (!status) {
-    LogUnusable(path, owner, "neither a file nor a folder of files");
+    LogUnusable(path, owner.uid, "neither a file nor a folder of files");
     return std::nullopt;
   }
   root->is_folder = S_ISDIR(status->st_mode);
@@ -82,10 +102,12 @@ const std::string &SharedTree::name() const {
 }
 
 std::optional<Item> SharedTree::Find(const std::vector<std::string> &parts) const {
-  if (!std::all_of(parts.begin(), parts.end(), IsVisibleName)) return std::nullopt;
   const OwnerScope as_owner(root_->owner);
-  if (!as_owner.IsEntered()) return std::nullopt;
+  return as_owner.IsEntered() ? FindEntered(parts) : std::nullopt;
+}
 
+std::optional<Item> SharedTree::FindEntered(const std::vector<std::string> &parts) const {
+  if (!std::all_of(parts.begin(), parts.end(), IsVisibleName)) return std::nullopt;
   UniqueFd file = Reopen(*root_, parts);
   const std::optional<struct stat> status = file.IsOpen() ? StatServed(file) : std::nullopt;
   if (!status) return std::nullopt;

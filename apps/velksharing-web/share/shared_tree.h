@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "share/item.h"
+#include "share/owner.h"
 
 namespace web::share {
 
@@ -36,6 +37,12 @@ class SharedTree {
   ///         log says why when the visitor is not to blame.
   static std::optional<SharedTree> Open(const std::string &path, uid_t owner);
 
+  /// Opens the tree and, with the same switch of rights, something in it.
+  /// @param[out] item as Find() gives it.
+  static std::optional<SharedTree> Open(const std::string &path, uid_t owner,
+                                        const std::vector<std::string> &parts,
+                                        std::optional<Item> &item);
+
   bool IsFolder() const;
   /// The last part of the path that the link names, in raw bytes; "" for "/".
   const std::string &name() const;
@@ -49,6 +56,10 @@ class SharedTree {
   const TreeRoot &root() const { return *root_; }
 
  private:
+  // Within the scope of the owner's rights.
+  static std::optional<SharedTree> OpenEntered(const std::string &path, const Owner &owner);
+  std::optional<Item> FindEntered(const std::vector<std::string> &parts) const;
+
   explicit SharedTree(std::shared_ptr<const TreeRoot> root);
 
   std::shared_ptr<const TreeRoot> root_;

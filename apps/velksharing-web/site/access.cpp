@@ -2,11 +2,20 @@
 
 #include <velksharing/access.h>
 #include <velksharing/constants.h>
+#include <velksharing/database.h>
+#include <velksharing/store.h>
+
+#include <utility>
 
 #include "site/result_names.h"
+#include "site/transaction.h"
 
 namespace web {
 namespace {
+
+using VELK::sharing::db::EntryDB;
+using VELK::sharing::db::SharingDB;
+using VELK::sharing::record::Entry;
 
 const char *FieldText(const Form &form, const char *name) {
   const std::string *value = form.Find(name);
@@ -15,11 +24,17 @@ const char *FieldText(const Form &form, const char *name) {
 
 }  // namespace
 
-Result Authorize(const std::string &hash, const std::string &session_id) {
+Checked Authorize(const std::string &hash, const std::string &session_id) {
   const _tag_sharing_login_params params = {hash.c_str(), nullptr, nullptr, nullptr,
                                             session_id.c_str()};
-  const int code = VELK::VelkSharingIsAuthorized(&params);
-  return {code, AuthResultName(code)};
+  Transaction transaction;
+  int code = VELK::VelkSharingIsAuthorized(&params);
+  Checked checked;
+  Entry link;
+  if (EntryDB(SharingDB::Instance()).GetByHash(hash, link)) checked.link = std::move(link);
+  if (!transaction.Commit()) code = VELK_SHARING_AUTH_UNUSABLE;
+  checked.result = {code, AuthResultName(code)};
+  return checked;
 }
 
 Result LogIn(const std::string &hash, const Form &form, bool keep_block_state,

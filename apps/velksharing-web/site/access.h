@@ -1,6 +1,9 @@
 #ifndef VELKSHARING_WEB_SITE_ACCESS_H
 #define VELKSHARING_WEB_SITE_ACCESS_H
 
+#include <velksharing/record.h>
+
+#include <optional>
 #include <string>
 
 #include "http/form.h"
@@ -10,8 +13,17 @@
 
 namespace web {
 
-/// Whether a session may use a link. The code is a VelkSharingAuthResult.
-Result Authorize(const std::string &hash, const std::string &session_id);
+/// What came of a check, with the link as it was at that moment.
+struct Checked {
+  Result result;                                     ///< The code is a VelkSharingAuthResult.
+  std::optional<VELK::sharing::record::Entry> link;  ///< Nothing for one that cannot be read.
+};
+
+/// Checks whether a session may use a link.
+///
+/// All of it is one transaction: the link is the one that was checked, and the database's write
+/// lock is taken and given back once.
+Checked Authorize(const std::string &hash, const std::string &session_id);
 
 /// Logs a visitor in by what a form says. Makes a new session always: one that the browser brought
 /// may have been put there by somebody else.

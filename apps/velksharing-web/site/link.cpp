@@ -45,10 +45,10 @@ std::string SharedPath(const Entry &entry) {
 }
 
 /// Opens what the link shares, where there is anything.
-bool OpenTree(Link &link) {
+bool OpenTree(Link &link, const std::vector<std::string> &parts) {
   const std::string path = SharedPath(link.entry);
   if (path.empty() || path.find('\0') != std::string::npos) return false;
-  link.tree = share::SharedTree::Open(path, link.entry.get_owner_uid());
+  link.tree = share::SharedTree::Open(path, link.entry.get_owner_uid(), parts, link.item);
   return link.tree.has_value();
 }
 
@@ -63,12 +63,18 @@ bool Link::CanDownload() const {
   return !(hidden.isBool() && hidden.asBool());
 }
 
-std::optional<Link> FindLink(const std::string &hash) {
+std::optional<Link> OpenLink(Entry entry, const std::vector<std::string> &parts) {
   Link link;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link.entry)) return std::nullopt;
+  link.entry = std::move(entry);
   ReadRedirect(link);
-  if (link.target.empty() && !OpenTree(link)) return std::nullopt;
+  if (link.target.empty() && !OpenTree(link, parts)) return std::nullopt;
   return link;
+}
+
+std::optional<Link> FindLink(const std::string &hash, const std::vector<std::string> &parts) {
+  Entry entry;
+  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, entry)) return std::nullopt;
+  return OpenLink(std::move(entry), parts);
 }
 
 bool AdmitsVisitors(const Link &link) {

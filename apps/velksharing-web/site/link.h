@@ -5,6 +5,7 @@
 
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "share/shared_tree.h"
 
@@ -19,6 +20,8 @@ struct Link {
   std::string continue_to;
   /// Open unless `target` is set.
   std::optional<share::SharedTree> tree;
+  /// What was asked for in the tree, where it is there.
+  std::optional<share::Item> item;
 
   bool HasUseLimit() const { return entry.get_expire_times() > 0; }
   bool IsOpen() const;
@@ -26,11 +29,16 @@ struct Link {
   bool CanDownload() const;
 };
 
-/// Looks a link up by its hash.
-/// @return nothing for a link that does not exist, cannot be read back, or has nothing to show:
-///         its owner is gone, or cannot read what it shares. Whether it is enabled, has started
-///         and the like is not looked at.
-std::optional<Link> FindLink(const std::string &hash);
+/// Opens what a link has for visitors.
+/// @param parts what is asked for in a folder: names from the top down.
+/// @return nothing for a link that has nothing to show: its owner is gone, or cannot read what it
+///         shares. Whether it is enabled, has started and the like is not looked at.
+std::optional<Link> OpenLink(VELK::sharing::record::Entry entry,
+                             const std::vector<std::string> &parts);
+
+/// Looks a link up by its hash, and opens it.
+/// @return nothing also for a link that does not exist or cannot be read back.
+std::optional<Link> FindLink(const std::string &hash, const std::vector<std::string> &parts = {});
 
 /// Whether a link lets new visitors in now.
 bool AdmitsVisitors(const Link &link);

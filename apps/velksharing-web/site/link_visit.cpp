@@ -52,14 +52,16 @@ LinkVisit::LinkVisit(const SiteParts &site, const Answers &answers, const Reques
 
 Response LinkVisit::Look(const SharedRequest &wanted) {
   note_.route = "page";
-  if (visitor_.session_id().empty()) return LookFromOutside(FindLink(hash_), wanted);
-  const Result result = Noted(Authorize(hash_, visitor_.session_id()));
-  const std::optional<Link> link = FindLink(hash_);
+  if (visitor_.session_id().empty()) return LookFromOutside(FindLink(hash_, wanted.parts), wanted);
+  Checked checked = Authorize(hash_, visitor_.session_id());
+  const Result &result = Noted(checked.result);
+  std::optional<Link> link;
+  if (checked.link) link = OpenLink(std::move(*checked.link), wanted.parts);
   if (result.code == VELK_SHARING_AUTH_OK)
     return link ? Show(*link, wanted) : Hidden(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (result.code == VELK_SHARING_AUTH_UNUSABLE && !(link && MayLackItsAccount(*link)))
     return Unavailable(result);
-  return LookFromOutside(link, wanted);
+  return LookFromOutside(std::move(link), wanted);
 }
 
 Response LinkVisit::LogIn(const Form &form) {
@@ -85,7 +87,7 @@ Response LinkVisit::LogOut(const Form &form) {
   return response;
 }
 
-Response LinkVisit::LookFromOutside(const std::optional<Link> &link, const SharedRequest &wanted) {
+Response LinkVisit::LookFromOutside(std::optional<Link> link, const SharedRequest &wanted) {
   if (!link || !AdmitsVisitors(*link)) return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (wanted.query.Has(kFarewellParameter) && !answers_.wants_json()) return Farewell(*link);
   if (link->IsOpen() && !link->HasUseLimit() && !visitor_.OnlyPeeks())
@@ -94,7 +96,7 @@ Response LinkVisit::LookFromOutside(const std::optional<Link> &link, const Share
                   CheckResult(VELK_SHARING_AUTH_NO_SESSION));
 }
 
-Response LinkVisit::EnterByLooking(const Link &link, const SharedRequest &wanted) {
+Response LinkVisit::EnterByLooking(Link &link, const SharedRequest &wanted) {
   const Form nothing;
   Secret session_id;
   const Result result = Noted(LogInOneByOne(link, nothing, session_id.text()));
@@ -111,10 +113,13 @@ Result LinkVisit::LogInOneByOne(const Link &link, const Form &form, std::string 
   return web::LogIn(hash_, form, link.IsOpen(), session_id);
 }
 
-Response LinkVisit::Show(const Link &link, const SharedRequest &wanted) {
+Response LinkVisit::Show(Link &link, const SharedRequest &wanted) {
   if (!link.target.empty()) return SendOn(link);
-  const SharedView view = {ViewOf(link), FormReader(), address_, link.CanDownload()};
-  Response response = SharedAnswers(answers_, site_.pages, view, *link.tree).Answer(wanted, note_);
+  // A token costs more than a small file.
+  const Reader reader = wanted.AsksForBytes() ? Reader{answers_.language(), ""} : FormReader();
+  const SharedView view = {ViewOf(link), reader, address_, link.CanDownload()};
+  Response response = SharedAnswers(answers_, site_.pages, view, *link.tree)
+                          .Answer(wanted, std::move(link.item), note_);
   if (response.headers.Get("Content-Type") == Pages::kContentType) visitor_.KeepFormKey(response);
   return response;
 }

@@ -48,10 +48,11 @@ class LinkVisit {
 
  private:
   // Ways in, and what is behind.
-  Response LookFromOutside(const std::optional<Link> &link, const SharedRequest &wanted);
-  Response EnterByLooking(const Link &link, const SharedRequest &wanted);
+  Response LookFromOutside(std::optional<Link> link, const SharedRequest &wanted);
+  Response EnterByLooking(Link &link, const SharedRequest &wanted);
   Result LogInOneByOne(const Link &link, const Form &form, std::string &session_id);
-  Response Show(const Link &link, const SharedRequest &wanted);
+  /// Takes the link's item.
+  Response Show(Link &link, const SharedRequest &wanted);
   Response SendOn(const Link &link);
   Response Welcome(const Link &link, const Result &result, const std::string &session_id) const;
 

@@ -91,12 +91,16 @@ bool IsAttachment(const Response &response) {
 
 }  // namespace
 
+bool SharedRequest::AsksForBytes() const {
+  return query.Has("download") || query.Has("view") || query.Has("thumbnail") || query.Has("zip");
+}
+
 SharedAnswers::SharedAnswers(const Answers &answers, const Pages &pages, const SharedView &view,
                              const share::SharedTree &tree)
     : answers_(answers), pages_(pages), view_(view), tree_(tree) {}
 
-Response SharedAnswers::Answer(const SharedRequest &wanted, AccessNote &note) const {
-  std::optional<share::Item> item = tree_.Find(wanted.parts);
+Response SharedAnswers::Answer(const SharedRequest &wanted, std::optional<share::Item> item,
+                               AccessNote &note) const {
   if (!item || (!item->is_folder && !wanted.parts.empty() && wanted.ends_with_slash))
     return answers_.Error(404);
   if (item->is_folder) return Folder(wanted, *item, note);

@@ -1,6 +1,7 @@
 #ifndef VELKSHARING_WEB_SITE_SHARED_ANSWERS_H
 #define VELKSHARING_WEB_SITE_SHARED_ANSWERS_H
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -22,6 +23,9 @@ struct SharedRequest {
   const Form &query;
   std::vector<std::string> parts;  ///< Names below what is shared.
   bool ends_with_slash = false;
+
+  /// Whether the answer is no page of ours, but a file, an image or an archive.
+  bool AsksForBytes() const;
 };
 
 /// How a link shows what it shares.
@@ -40,8 +44,10 @@ class SharedAnswers {
   SharedAnswers(const Answers &answers, const Pages &pages, const SharedView &view,
                 const share::SharedTree &tree);
 
+  /// @param item what is asked for; nothing when it is not there.
   /// @param note its route is set.
-  Response Answer(const SharedRequest &wanted, AccessNote &note) const;
+  Response Answer(const SharedRequest &wanted, std::optional<share::Item> item,
+                  AccessNote &note) const;
 
  private:
   Response Folder(const SharedRequest &wanted, const share::Item &folder, AccessNote &note) const;
