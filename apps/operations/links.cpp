@@ -16,15 +16,6 @@ using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 using VELK::sharing::db::TokenDB;
 
-int FindLinkId(BaseDB &db, const std::string &hash) {
-  Result result;
-  Row row;
-  if (!db.Execute("SELECT id FROM entry WHERE hash = '" + db.Escape(hash) + "'", result))
-    throw DatabaseFailure(db, "links could not be read");
-  if (!result.NextRow(row)) throw Failure(Failure::NOT_FOUND, "there is no link “" + hash + "”");
-  return row.GetField(SZK_ID_).AsInt(0);
-}
-
 void RefuseIllegal(const Entry &link) {
   if (link.IsLegal()) return;
   throw Failure(Failure::REFUSED, "the link is not fit to be stored; the system log tells why");
@@ -53,6 +44,15 @@ Removal PurgeResult(BaseDB &db, bool purged) {
 }
 
 }  // namespace
+
+int FindLinkId(BaseDB &db, const std::string &hash) {
+  Result result;
+  Row row;
+  if (!db.Execute("SELECT id FROM entry WHERE hash = '" + db.Escape(hash) + "'", result))
+    throw DatabaseFailure(db, "links could not be read");
+  if (!result.NextRow(row)) throw Failure(Failure::NOT_FOUND, "there is no link “" + hash + "”");
+  return row.GetField(SZK_ID_).AsInt(0);
+}
 
 Entry FindLink(BaseDB &db, const std::string &hash) {
   Entry link;

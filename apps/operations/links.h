@@ -21,6 +21,9 @@ using VELK::sharing::record::Entry;
 /// The link of a hash.
 Entry FindLink(BaseDB &db, const std::string &hash);
 
+/// The row id of a link, also of one whose row cannot be loaded.
+int FindLinkId(BaseDB &db, const std::string &hash);
+
 /// Makes a link under a fresh hash. `change` must give project and owner; without `app` the link
 /// gets an empty one.
 Entry CreateLink(BaseDB &db, const LinkChange &change);

@@ -77,6 +77,14 @@ class Request {
 
 }  // namespace
 
+VisitResult ExplainLogin(int code) {
+  return Explain(kLoginResults, code);
+}
+
+VisitResult ExplainLogout(int code) {
+  return Explain(kLogoutResults, code);
+}
+
 Credential CredentialOf(BaseDB &db, const std::string &hash) {
   try {
     const Entry::ProtectType type = FindLink(db, hash).get_protect_type();
@@ -96,7 +104,7 @@ VisitResult LogIn(const Visit &visit, Secret &session_id) {
       VelkSharingLogin(buffer.data(), buffer.size(), &parameters, visit.keep_block_state ? 1 : 0);
   for (const char *byte = buffer.c_str(); *byte != '\0'; ++byte) session_id.Append(*byte);
   Wipe(buffer);
-  return Explain(kLoginResults, code);
+  return ExplainLogin(code);
 }
 
 VisitResult Check(const Visit &visit) {
@@ -107,7 +115,7 @@ VisitResult Check(const Visit &visit) {
 
 VisitResult LogOut(const Visit &visit) {
   const Request request(visit.address);
-  return Explain(kLogoutResults, VelkSharingLogout(visit.hash.c_str(), Text(visit.session_id)));
+  return ExplainLogout(VelkSharingLogout(visit.hash.c_str(), Text(visit.session_id)));
 }
 
 }  // namespace operations

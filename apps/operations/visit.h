@@ -29,6 +29,10 @@ struct VisitResult {
   const char *meaning;  ///< One sentence without a full stop.
 };
 
+/// What a code of a login, or of a logout, means; "UNKNOWN" for one that there is not.
+VisitResult ExplainLogin(int code);
+VisitResult ExplainLogout(int code);
+
 /// What a link asks its visitors for.
 enum Credential { NO_CREDENTIAL, LINK_PASSWORD, ACCOUNT };
 

@@ -81,6 +81,9 @@ ExitStatus ForEach(const std::vector<Item> &items, const Request &request, Step 
   return status;
 }
 
+/// `link log`, which goes into the group of links.
+void AddLinkLogCommand(CLI::App &group, Request &request);
+
 // One command group each.
 void AddLinkCommands(CLI::App &program, Request &request);
 void AddSessionCommands(CLI::App &program, Request &request);

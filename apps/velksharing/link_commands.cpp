@@ -349,6 +349,7 @@ void AddLinkCommands(CLI::App &program, Request &request) {
   AddPurge(*group, request);
   AddUrl(*group, request);
   AddWhy(*group, request);
+  AddLinkLogCommand(*group, request);
 }
 
 }  // namespace command_line

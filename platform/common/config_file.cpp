@@ -1,5 +1,6 @@
 #include "common/config_file.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <charconv>
 #include <fstream>
@@ -28,7 +29,8 @@ Setting Split(std::string_view line) {
 
 void ReadConfigFile(
     const std::string &path,
-    const std::function<void(std::string_view key, std::string_view value)> &setting) {
+    const std::function<void(std::string_view key, std::string_view value)> &setting,
+    std::initializer_list<std::string_view> repeatable) {
   errno = 0;
   std::ifstream file(path);
   if (!file && errno == ENOENT) return;
@@ -40,7 +42,9 @@ void ReadConfigFile(
     if (line.empty()) continue;
     try {
       const auto [key, value] = Split(line);
-      if (!seen.emplace(key).second) throw ConfigMistake("key given twice");
+      const bool is_new = seen.emplace(key).second;
+      if (!is_new && std::find(repeatable.begin(), repeatable.end(), key) == repeatable.end())
+        throw ConfigMistake("key given twice");
       setting(key, value);
     } catch (const ConfigMistake &mistake) {
       throw ConfigMistake(path + ":" + std::to_string(number) + ": " + mistake.what());

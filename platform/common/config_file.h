@@ -2,6 +2,7 @@
 #define COMMON_CONFIG_FILE_H
 
 #include <functional>
+#include <initializer_list>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -19,11 +20,13 @@ class ConfigMistake : public std::runtime_error {
 
 /// Hands every setting of a file to `setting`, which throws ConfigMistake for one that it does not
 /// like. A missing file has no settings.
-/// @throws ConfigMistake for what `setting` refuses, a line of another form, a key that is given
-///         twice, and a file that cannot be read.
+/// @param repeatable keys that may be given several times.
+/// @throws ConfigMistake for what `setting` refuses, a line of another form, another key that is
+///         given twice, and a file that cannot be read.
 void ReadConfigFile(
     const std::string &path,
-    const std::function<void(std::string_view key, std::string_view value)> &setting);
+    const std::function<void(std::string_view key, std::string_view value)> &setting,
+    std::initializer_list<std::string_view> repeatable = {});
 
 /// A whole number from `lowest` to `highest`.
 /// @throws ConfigMistake.

@@ -27,6 +27,7 @@ const std::vector<std::vector<std::string>> kCommands = {
     {"link", "purge"},
     {"link", "url"},
     {"link", "why"},
+    {"link", "log"},
     {"session", "list"},
     {"session", "delete"},
     {"session", "purge"},

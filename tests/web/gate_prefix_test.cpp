@@ -90,9 +90,9 @@ TEST(GatePrefix, RefusesWhatIsNone) {
 }
 
 TEST(GatePrefix, RefusesAPathThatServersReadInSeveralWays) {
-  for (const char *text : {"/a//b", "//", "/a/", "/a/../b", "/./a", "/%2e%2e/", "/a%2Fb", "/a\\b",
-                           "/a;b", "/a%3Bb", "/a%3F", "/%2561", "https://h//a"})
-    EXPECT_EQ(std::string_view(text) == "/a/" ? "/a" : "refused", TextOf(text)) << text;
+  for (const char *text : {"/a//b", "//", "/a/../b", "/./a", "/%2e%2e/", "/a%2Fb", "/a\\b", "/a;b",
+                           "/a%3Bb", "/a%3F", "/%2561", "https://h//a"})
+    EXPECT_EQ("refused", TextOf(text)) << text;
 }
 
 TEST(GatePrefix, CoversItselfAndAllBelow) {

@@ -144,11 +144,12 @@ class Spelling {
   std::string Next() {
     static const Names kPrivate = {"private", "%70rivate", "%2570rivate", "priv%2561te"};
     static const Names kPieces = {
-        "/",        "/",     "/",       "/",     "private", "private", "public", "a",      "..",
-        "..",       ".",     "%2e",     "%2E",   "%2e%2e",  "%252e",   "%2F",    "%2f",    "%252F",
-        "\\",       "%5C",   "%255c",   "//",    ";",       ";x=y",    "%3B",    "%253b",  "%3F",
-        "%23",      "%253F", "%70",     "%2570", "riv",     "ate",     "%72",    "rivate", "/../",
-        "/private", "/..;/", "/public", "%25",   "70",      "%%32",    "%C3%A9", "%20",    "/./"};
+        "/",          "/",     "/",      "/",    "private",  "private", "public",  "a",
+        "..",         "..",    ".",      "%2e",  "%2E",      "%2e%2e",  "%252e",   "%2F",
+        "%2f",        "%252F", "\\",     "%5C",  "%255c",    "//",      ";",       ";x=y",
+        "%3B",        "%253b", "%3F",    "%23",  "%253F",    "%70",     "%2570",   "riv",
+        "ate",        "%72",   "rivate", "/../", "/private", "/..;/",   "/public", "/%70ublic",
+        "%5Cy\\..\\", "%25",   "70",     "%%32", "%C3%A9",   "%20",     "/./"};
     return "/" + Pieces(kPieces) + kPrivate[Below(kPrivate.size())] + Pieces(kPieces);
   }
   size_t Below(size_t limit) {

@@ -31,9 +31,8 @@ def ways_out(name):
     return ways
 
 
-SCHEMES = ("", "http:", "https:", "HTTPS:", "https", "https%3a", "%68ttps:", " https:", "\thttps:",
-           "ht\ttps:", "ht\ntps:", "\r\nhttps:", "\x01https:", "https :", "javascript:", "ftp:",
-           "data:text/html,", "view-source:https:")
+SCHEMES = ("", "http:", "https:", "HTTPS:", "https%3a", "%68ttps:", " https:", "\thttps:", "ht\ttps:",
+           "ht\ntps:", "\r\nhttps:", "javascript:", "data:text/html,")
 
 MIDDLES = ("//", "/", "///", "////", "\\\\", "/\\", "\\/", "/%5c", "%2f%2f", "%5c%5c", "/%09/", "/\t/",
            "/\n/", "//\\", "//@", "//.", "//127.0.0.1@", "//127.0.0.1:80@", "//127.0.0.1\\@",

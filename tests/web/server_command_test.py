@@ -48,6 +48,8 @@ class Configuration(FrontEndTest):
                      "path = sharing", "path = /a b", "path = /a/../b", "path = //a",
                      "access_log = here", "runtime_folder = run", "retry_after = -1",
                      "trusted_proxy = somebody", "file_delivery = pigeon",
+                     "audit = maybe", "audit_retention = 0", "audit_retention = 3651",
+                     "audit_address = some", "metrics_listen = 0.0.0.0:9180",
                      "socket_group = no such group", "fastcgi = socket",
                      "product_name = " + "x" * 201, "connections = 99999999999999999999"):
             with self.subTest(line):

@@ -118,6 +118,16 @@ TEST_F(SiteAccount, APermittedAccountIsLetIn) {
   EXPECT_THAT(BodyOf(page), HasSubstr("hello.txt"));
 }
 
+TEST_F(SiteAccount, TheAccountIsNotedOfWhoIsLetInOnly) {
+  Browser browser(site());
+  browser.Submit(kLink, Credentials("root", "wrong"));
+  EXPECT_EQ(std::nullopt, browser.note().uid);
+  browser.Submit(kLink, Credentials("root", kPassword));
+  EXPECT_EQ(0u, browser.note().uid);
+  browser.Submit(kLink, "/sharing/abc/logout", {});
+  EXPECT_EQ(0u, browser.note().uid);
+}
+
 TEST_F(SiteAccount, AWrongPasswordIsAskedForAgainWithTheNameTyped) {
   Browser browser(site());
   Response response = browser.Submit(kLink, Credentials("root", "wrong"));

@@ -109,30 +109,47 @@ int StoreLimitedLink(const std::string &hash, const std::string &folder, int use
   return EntryDB(SharingDB::Instance()).Create(entry) ? 0 : 1;
 }
 
+/// @param target path, and query behind a question mark.
+web::Request RequestFor(const std::string &method, const std::string &target) {
+  web::Request request;
+  request.method = method;
+  const size_t mark = target.find('?');
+  request.path = target.substr(0, mark);
+  if (mark != std::string::npos) request.query = target.substr(mark + 1);
+  return request;
+}
+
+/// As the web server of that address asks; the path is what cookies go by.
+web::Request QuestionAbout(const std::string &address, bool is_authorizer) {
+  const size_t host = address.find("://");
+  const size_t path = host == std::string::npos ? host : address.find('/', host + 3);
+  web::Request request = RequestFor("GET", path == std::string::npos ? "/" : address.substr(path));
+  request.question = web::Question{address, is_authorizer};
+  return request;
+}
+
 Browser::Browser(web::Site &site, std::string address)
     : site_(site), address_(std::move(address)) {}
 
 web::Response Browser::Get(const std::string &target, const HeaderList &headers) {
-  web::Request request;
-  request.method = "GET";
-  const size_t mark = target.find('?');
-  request.path = target.substr(0, mark);
-  if (mark != std::string::npos) request.query = target.substr(mark + 1);
-  return Send(std::move(request), headers);
+  return Send(RequestFor("GET", target), headers);
 }
 
 web::Response Browser::Head(const std::string &target, const HeaderList &headers) {
-  web::Request request;
-  request.method = "HEAD";
-  request.path = target;
-  return Send(std::move(request), headers);
+  return Send(RequestFor("HEAD", target), headers);
 }
 
-web::Response Browser::Post(const std::string &path, const FieldList &fields,
+web::Response Browser::Ask(const std::string &address, const HeaderList &headers) {
+  return Send(QuestionAbout(address, false), headers);
+}
+
+web::Response Browser::AskAsAuthorizer(const std::string &address, const HeaderList &headers) {
+  return Send(QuestionAbout(address, true), headers);
+}
+
+web::Response Browser::Post(const std::string &target, const FieldList &fields,
                             const HeaderList &headers) {
-  web::Request request;
-  request.method = "POST";
-  request.path = path;
+  web::Request request = RequestFor("POST", target);
   request.headers.Add("Content-Type", "application/x-www-form-urlencoded");
   request.body = Encoded(fields);
   return Send(std::move(request), headers);

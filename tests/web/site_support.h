@@ -44,8 +44,11 @@ class Browser {
   /// @param target path, and query behind a question mark.
   web::Response Get(const std::string &target, const HeaderList &headers = {});
   web::Response Head(const std::string &target, const HeaderList &headers = {});
+  /// Asks a web server for an address, which asks the site.
+  web::Response Ask(const std::string &address, const HeaderList &headers = {});
+  web::Response AskAsAuthorizer(const std::string &address, const HeaderList &headers = {});
   /// Sends a form as it is, without a token.
-  web::Response Post(const std::string &path, const FieldList &fields,
+  web::Response Post(const std::string &target, const FieldList &fields,
                      const HeaderList &headers = {});
   /// Opens the page at `page`, and sends the fields with its token to `path`.
   web::Response Submit(const std::string &page, const std::string &path, FieldList fields,

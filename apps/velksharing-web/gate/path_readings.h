@@ -11,7 +11,7 @@
 namespace web::gate {
 
 /// A path that could be read in more ways is refused.
-constexpr size_t kMostReadings = 32;
+constexpr size_t kMostReadings = 64;
 
 /// In how many ways the servers behind the gate may read a path.
 ///
@@ -32,7 +32,7 @@ constexpr size_t kMostReadings = 32;
 ///
 /// A path with none of this has one reading. So has one whose only escapes are those that browsers
 /// write, such as "%20" and "%C3%A9". An escape without need ("%70") makes two: there are servers
-/// that compare the path as it was sent.
+/// that compare the path as it was sent. Most addresses with another address in them have some ten.
 ///
 /// Not told apart are the ways to write an escape that is needed: "%c3", "%C3" and the bare byte.
 /// Not seen are a server's wishes beyond all that: one that ignores case, takes "+" for a blank,
@@ -40,9 +40,9 @@ constexpr size_t kMostReadings = 32;
 ///
 /// @param path begins with "/"; without query. A slash at its end makes no difference.
 /// @return distinct readings, the one that is closest to what was sent first; nothing for a path
-///         that holds a blank, a control character, a broken escape, a character of UTF-8 that is
-///         longer than it need be, or any of the latter two behind more escapes; and for one with
-///         more than `kMostReadings`.
+///         that holds a bare blank, a control character or a character of UTF-8 that is longer than
+///         it need be, bare or behind escapes, or a broken escape; and for one with more than
+///         `kMostReadings`.
 std::optional<std::vector<Reading>> ReadingsOf(std::string_view path);
 
 /// The reading of a path that can be read in one way. Escapes without need do not count: they are

@@ -13,9 +13,9 @@ std::string_view Unquoted(std::string_view value) {
   return value;
 }
 
-/// Looks for a cookie in one header field.
-/// @return whether it is there.
-bool FindIn(std::string_view header, std::string_view name, std::string_view &value) {
+/// Looks for the next cookie of a name in one header field, and takes away all up to it.
+/// @return whether there is one.
+bool FindNext(std::string_view &header, std::string_view name, std::string_view &value) {
   while (!header.empty()) {
     std::string_view pair = TakePart(header, ';');
     if (Trimmed(TakePart(pair, '=')) != name) continue;
@@ -37,9 +37,21 @@ bool IsCookieText(std::string_view text) {
 
 std::string_view FindCookie(const Request &request, std::string_view name) {
   std::string_view value;
-  for (const Fields::Field &field : request.headers)
-    if (IsSameText(field.first, "Cookie") && FindIn(field.second, name, value)) break;
+  for (const Fields::Field &field : request.headers) {
+    std::string_view rest = field.second;
+    if (IsSameText(field.first, "Cookie") && FindNext(rest, name, value)) break;
+  }
   return value;
+}
+
+std::vector<std::string_view> FindCookies(const Request &request, std::string_view name) {
+  std::vector<std::string_view> values;
+  for (const Fields::Field &field : request.headers) {
+    if (!IsSameText(field.first, "Cookie")) continue;
+    std::string_view rest = field.second;
+    for (std::string_view value; FindNext(rest, name, value);) values.push_back(value);
+  }
+  return values;
 }
 
 std::string SetCookieText(const Cookie &cookie) {

@@ -3,6 +3,7 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "http/request.h"
 
@@ -11,6 +12,9 @@ namespace web {
 /// The value of a cookie that a request brings, without quotes around it; "" when there is none.
 /// The first of equal names counts: browsers send that of the longest path first.
 std::string_view FindCookie(const Request &request, std::string_view name);
+
+/// The values of all cookies of a name, in the order in which they come.
+std::vector<std::string_view> FindCookies(const Request &request, std::string_view name);
 
 /// A cookie for the browser. It is always HttpOnly and SameSite=Lax, and ends with the browser's
 /// session.

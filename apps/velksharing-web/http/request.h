@@ -1,11 +1,18 @@
 #ifndef VELKSHARING_WEB_HTTP_REQUEST_H
 #define VELKSHARING_WEB_HTTP_REQUEST_H
 
+#include <optional>
 #include <string>
 
 #include "http/fields.h"
 
 namespace web {
+
+/// A web server's question whether a visitor may see something that it serves itself.
+struct Question {
+  std::string address;         ///< What the visitor asked that server for, whole; "" when unclear.
+  bool is_authorizer = false;  ///< Whether it takes 200, and nothing else, for a yes.
+};
 
 /// A visitor's request, as every way of running the program hands it over: read whole, within the
 /// limits of head and form, and otherwise unchecked.
@@ -17,6 +24,8 @@ struct Request {
   std::string body;
   std::string remote_address;  ///< The visitor's, as text: "192.0.2.7".
   bool is_https = false;       ///< Whether the visitor came by https.
+  /// Where there is one, method, path, query and body are the web server's own, and mean nothing.
+  std::optional<Question> question;
 };
 
 }  // namespace web

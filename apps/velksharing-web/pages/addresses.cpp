@@ -29,6 +29,10 @@ std::string Addresses::Link(std::string_view hash) const {
   return base_path_ + "/" + PercentEncode(hash);
 }
 
+std::string Addresses::Login(std::string_view hash, std::string_view return_to) const {
+  return return_to.empty() ? Link(hash) : Link(hash) + "?return=" + PercentEncode(return_to);
+}
+
 std::string Addresses::Logout(std::string_view hash) const {
   return Link(hash) + "/logout";
 }

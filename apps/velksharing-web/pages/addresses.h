@@ -16,6 +16,9 @@ class Addresses {
 
   /// What is shared itself.
   std::string Link(std::string_view hash) const;
+  /// Where a login form is posted.
+  /// @param return_to path and query that the visitor goes on to; "" for none.
+  std::string Login(std::string_view hash, std::string_view return_to) const;
   std::string Logout(std::string_view hash) const;
   /// A folder below the shared one, with a slash at its end; the link for an empty path.
   std::string Folder(std::string_view hash, const std::vector<std::string> &path) const;

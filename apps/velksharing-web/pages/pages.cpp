@@ -87,7 +87,7 @@ class PagesPrivate {
     const Catalogue &texts = Texts(reader);
     Data data;
     data.set("title", TitleOf(view.link, texts));
-    data.set("action", addresses.Link(view.link.hash));
+    data.set("action", addresses.Login(view.link.hash, view.return_to));
     SetOrFalse(data, "problem", ProblemText(texts, view.problem));
     SetFlag(data, "is_refused", view.problem == LoginProblem::kRefused);
     data.set("account", ShownName(view.account));
@@ -176,6 +176,13 @@ std::string Pages::Continue(const Reader &reader, const LinkView &link,
   SetOrFalse(data, "hint", host.empty() ? "" : texts.Text("continue_hint", {{"host", host}}));
   return private_->Document(reader, {"continue", texts.Text("continue_window"), link, address},
                             data);
+}
+
+std::string Pages::Guarded(const Reader &reader, const std::string &login) const {
+  Data data;
+  data.set("login", login);
+  const std::string title = private_->Texts(reader).Text("guarded_window");
+  return private_->Document(reader, {"guarded", title, {}, login}, data);
 }
 
 std::string Pages::Folder(const Reader &reader, const FolderView &view) const {

@@ -100,6 +100,11 @@ class Pages {
   /// by itself. A target that is none leads back to the link.
   std::string Continue(const Reader &reader, const LinkView &link, const std::string &target) const;
 
+  /// Says to somebody who asked for a guarded page that he has to log in, and goes on to the login
+  /// page by itself.
+  /// @param login path and query of that page, percent-encoded.
+  std::string Guarded(const Reader &reader, const std::string &login) const;
+
   std::string Folder(const Reader &reader, const FolderView &view) const;
   std::string File(const Reader &reader, const FileView &view) const;
 

@@ -47,6 +47,8 @@ struct LoginView {
   LinkView link{};
   LoginProblem problem = LoginProblem::kNone;
   std::string account{};  ///< Account page only: the name that was typed, shown again.
+  /// Path and query that the visitor came for; the form's address takes it along. "" for none.
+  std::string return_to{};
 };
 
 /// What a file is, as far as icon and preview are concerned.

@@ -4,6 +4,7 @@
 #include <chrono>
 #include <cstdint>
 #include <mutex>
+#include <optional>
 #include <string>
 
 #include "http/unique_fd.h"
@@ -15,12 +16,17 @@ namespace web {
 struct Visit {
   std::chrono::system_clock::time_point began = std::chrono::system_clock::now();
   std::chrono::steady_clock::time_point clock = std::chrono::steady_clock::now();  ///< As `began`.
-  std::string address;  ///< The visitor's.
-  std::string method;   ///< As sent.
+  std::chrono::steady_clock::time_point head = clock;              ///< When its head was there.
+  std::optional<std::chrono::steady_clock::duration> answer_time;  ///< From there to the answer.
+  std::string address;                                             ///< The visitor's.
+  std::string method;                                              ///< As sent.
   AccessNote note;
   int status = 0;
   uint64_t bytes = 0;    ///< Of the body, as announced or made.
   bool is_whole = true;  ///< false: the connection broke before the end.
+
+  /// To be called as soon as the answer is made.
+  void MarkAnswered() { answer_time = std::chrono::steady_clock::now() - head; }
 };
 
 /// One line for each request, of words with one blank between:

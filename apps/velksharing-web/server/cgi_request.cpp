@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <charconv>
 #include <cstring>
+#include <optional>
 #include <string_view>
 
 #include "http/percent.h"
@@ -17,13 +18,18 @@ constexpr int kBadRequest = 400;
 constexpr int kContentTooLarge = 413;
 constexpr int kHeadTooLarge = 431;
 
-std::string_view Variable(const char *const *environment, std::string_view name) {
+std::optional<std::string_view> FindVariable(const char *const *environment,
+                                             std::string_view name) {
   for (; *environment != nullptr; ++environment) {
     const std::string_view variable = *environment;
     if (variable.starts_with(name) && variable.substr(name.size()).starts_with('='))
       return variable.substr(name.size() + 1);
   }
-  return {};
+  return std::nullopt;
+}
+
+std::string_view Variable(const char *const *environment, std::string_view name) {
+  return FindVariable(environment, name).value_or(std::string_view());
 }
 
 /// "X_SHARING" becomes "X-Sharing".
@@ -126,14 +132,24 @@ int ReadBody(std::string_view length_text, const BodyReader &read, std::string &
 
 }  // namespace
 
-CgiRequest ReadCgiRequest(const char *const *environment, const BodyReader &body) {
-  CgiRequest cgi;
-  Request &request = cgi.request;
+bool HasVariable(const char *const *environment, std::string_view name) {
+  return FindVariable(environment, name).has_value();
+}
+
+Request ReadCgiHead(const char *const *environment) {
+  Request request;
   request.method = Variable(environment, "REQUEST_METHOD");
   request.headers = ReadFields(environment);
   request.remote_address = Variable(environment, "REMOTE_ADDR");
   const std::string_view https = Variable(environment, "HTTPS");
   request.is_https = !https.empty() && https != "off";
+  return request;
+}
+
+CgiRequest ReadCgiRequest(const char *const *environment, const BodyReader &body) {
+  CgiRequest cgi;
+  Request &request = cgi.request;
+  request = ReadCgiHead(environment);
   if (!ReadTarget(environment, request)) {
     cgi.refusal = kBadRequest;
   } else if (HeadSize(request) > kHeadLimit) {

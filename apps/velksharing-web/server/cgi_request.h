@@ -3,6 +3,7 @@
 
 #include <cstdint>
 #include <functional>
+#include <string_view>
 
 #include "http/request.h"
 
@@ -16,6 +17,12 @@ struct CgiRequest {
   Request request;
   int refusal = 0;  ///< Status to refuse it with, 0 for none.
 };
+
+/// Whether one of these "NAME=value" texts, which end with null, has this name.
+bool HasVariable(const char *const *environment, std::string_view name);
+
+/// Method, header fields and visitor of a request; no target and no body.
+Request ReadCgiHead(const char *const *environment);
 
 /// Makes a request of "NAME=value" texts, which end with null, and of the body. The target is
 /// REQUEST_URI as the visitor sent it; a web server without that has SCRIPT_NAME and PATH_INFO, and

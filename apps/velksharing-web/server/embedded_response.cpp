@@ -63,9 +63,10 @@ MHD_Response *WithoutBody() {
   return response;
 }
 
-/// Whether there is neither a body nor a length of one to be told.
+/// Whether there is neither a body nor a length of one to be told. The library knows by itself that
+/// 204 has neither.
 bool IsHeadAlone(const Response &response, const std::string &method) {
-  return IsBodiless(response.status) || (!HasBody(response, method) && !BodyLength(response));
+  return response.status == 304 || (!HasBody(response, method) && !BodyLength(response));
 }
 
 MHD_Response *WithBody(Response &response, const std::string &method, uint64_t &bytes) {

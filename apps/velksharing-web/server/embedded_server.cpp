@@ -8,6 +8,7 @@
 
 #include "server/acceptor.h"
 #include "server/answer_head.h"
+#include "server/auth_questions.h"
 #include "server/body_copy.h"
 #include "server/connection_watch.h"
 #include "server/embedded_response.h"
@@ -104,6 +105,7 @@ class EmbeddedServerPrivate {
   MHD_Result Reply(Exchange &exchange, MHD_Connection *connection);
 
   const TrustedProxies proxies_;
+  const AuthQuestions questions_;
   Service &service_;
   ConnectionWatch watch_{kPatience};
   MHD_Daemon *daemon_ = nullptr;
@@ -112,7 +114,7 @@ class EmbeddedServerPrivate {
 
 EmbeddedServerPrivate::EmbeddedServerPrivate(int listening_socket, const Settings &settings,
                                              Service &service)
-    : proxies_(settings.trusted_proxies), service_(service) {
+    : proxies_(settings.trusted_proxies), questions_(settings), service_(service) {
   daemon_ =
       MHD_start_daemon(MHD_USE_POLL_INTERNAL_THREAD | MHD_USE_THREAD_PER_CONNECTION | MHD_USE_ITC |
                            MHD_USE_NO_LISTEN_SOCKET,
@@ -171,12 +173,14 @@ MHD_Result EmbeddedServerPrivate::OnRequest(void *self, MHD_Connection *connecti
 
 bool EmbeddedServerPrivate::TakeHead(Exchange &exchange, MHD_Connection *connection,
                                      const char *method, const char *version) {
+  exchange.visit.head = std::chrono::steady_clock::now();
   Request &request = exchange.request;
   request.method = exchange.visit.method = method;
   const std::vector<RawField> fields = FieldsOf(connection);
   for (const auto &[name, value] : fields)
     request.headers.Add(std::string(name), std::string(value));
-  const bool is_identified = proxies_.Identify(PeerOf(connection), request);
+  const std::string peer = PeerOf(connection);
+  const bool is_identified = proxies_.Identify(peer, request);
   const HeadVerdict verdict = JudgeHead(request, version);
   exchange.visit.address = request.remote_address;
 
@@ -184,6 +188,7 @@ bool EmbeddedServerPrivate::TakeHead(Exchange &exchange, MHD_Connection *connect
   const std::string_view head(method, HeadSizeOf(connection));
   if (!IsAccountedFor(head, version, fields)) exchange.refusal = kBadRequest;
   if (!is_identified || !SetTarget(exchange.target, request)) exchange.refusal = kBadRequest;
+  questions_.Recognise(request, proxies_.Trusts(peer));
   if (head.size() > kHeadLimit) exchange.refusal = kHeadTooLarge;
   if (exchange.refusal != 0 && (verdict.body_length == 0 || verdict.body_length > kDiscardLimit))
     return false;
@@ -206,6 +211,7 @@ MHD_Result EmbeddedServerPrivate::Reply(Exchange &exchange, MHD_Connection *conn
   Response response = exchange.refusal == 0 ? service_.Answer(exchange.request, exchange.visit.note)
                                             : service_.Refuse(exchange.request, exchange.refusal);
   if (exchange.refusal != 0 || service_.IsStopping()) response.headers.Set("Connection", "close");
+  exchange.visit.MarkAnswered();
   exchange.visit.status = response.status;
   if (HasBody(response, exchange.request.method))
     exchange.visit.bytes = BodyLength(response).value_or(0);

@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "server/answer_head.h"
+#include "server/auth_questions.h"
 #include "server/body_copy.h"
 #include "server/cgi_request.h"
 #include "server/file_offload.h"
@@ -22,7 +23,9 @@
 namespace web {
 namespace {
 
-constexpr int kResponder = 1;      // FCGI_RESPONDER, which no public header has
+// Roles, which no public header has.
+constexpr int kResponder = 1;
+constexpr int kAuthorizer = 2;
 constexpr int kLookAround = 1000;  // milliseconds between looks whether others need the thread
 
 /// A request of the web server, and the connection that it came by.
@@ -48,6 +51,7 @@ class Channel {
   /// -1 for none.
   int connection() const { return request_.ipcFd; }
   bool IsResponder() const { return request_.role == kResponder; }
+  bool IsAuthorizer() const { return request_.role == kAuthorizer; }
   const char *const *environment() const { return request_.envp; }
 
  private:
@@ -105,11 +109,13 @@ class FastCgiServerPrivate {
   bool WaitForKept(Channel &channel);
   bool IsStopped() const;
 
+  CgiRequest Read(Channel &channel) const;
   void Respond(Channel &channel);
   bool Send(Response &response, Channel &channel, Visit &visit);
 
   const int listening_socket_;
   const FileOffload offload_;
+  const AuthQuestions questions_;
   Service &service_;
   ListeningWait wait_;
   std::mutex accepting_;
@@ -122,6 +128,7 @@ FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings 
                                            Service &service)
     : listening_socket_(listening_socket),
       offload_(settings),
+      questions_(settings),
       service_(service),
       wait_(listening_socket),
       connections_(static_cast<size_t>(settings.threads)) {
@@ -185,17 +192,24 @@ bool FastCgiServerPrivate::IsStopped() const {
   return poll(&watched, 1, 0) > 0;
 }
 
+CgiRequest FastCgiServerPrivate::Read(Channel &channel) const {
+  const char *const *environment = channel.environment();
+  if (AuthQuestions::Is(environment, channel.IsAuthorizer()))
+    return {questions_.Read(environment, channel.IsAuthorizer()), 0};
+  CgiRequest cgi = ReadCgiRequest(
+      environment, [&channel](char *buffer, size_t size) { return channel.Read(buffer, size); });
+  if (!channel.IsResponder()) cgi.refusal = 501;
+  return cgi;
+}
+
 void FastCgiServerPrivate::Respond(Channel &channel) {
   Visit visit;
-  CgiRequest cgi = ReadCgiRequest(channel.environment(), [&channel](char *buffer, size_t size) {
-    return channel.Read(buffer, size);
-  });
+  CgiRequest cgi = Read(channel);
   visit.address = cgi.request.remote_address;
   visit.method = cgi.request.method;
-  // An authorizer's answer would let its visitor in to something else.
-  if (!channel.IsResponder()) cgi.refusal = 501;
   Response response = cgi.refusal == 0 ? service_.Answer(cgi.request, visit.note)
                                        : service_.Refuse(cgi.request, cgi.refusal);
+  visit.MarkAnswered();
   visit.status = response.status;
   visit.is_whole = Send(response, channel, visit) && channel.Finish();
   if (!visit.is_whole) channel.Cut();

@@ -7,10 +7,13 @@
 #include <cstdlib>
 #include <exception>
 #include <iostream>
+#include <optional>
 
 #include "common/config_file.h"
 #include "server/embedded_server.h"
 #include "server/fastcgi_server.h"
+#include "server/notebook.h"
+#include "server/observer.h"
 #include "server/options.h"
 #include "server/plain_cgi.h"
 #include "server/privileges.h"
@@ -19,6 +22,7 @@
 #include "server/sockets.h"
 #include "server/supervisor.h"
 #include "site/turn.h"
+#include "watch/watch.h"
 
 namespace {
 
@@ -53,38 +57,89 @@ UniqueFd OpenSocket(const Settings &settings, Mode mode) {
   return Listen(kDefaultListen, access);
 }
 
+UniqueFd OpenMetricsSocket(const Settings &settings) {
+  if (settings.metrics_listen.empty()) return UniqueFd();
+  UniqueFd socket = Listen(settings.metrics_listen, {settings.socket_mode, settings.socket_group});
+  syslog(LOG_INFO, "metrics on %s", AddressOf(socket.get()).c_str());
+  return socket;
+}
+
+/// What all processes of a server have from the time before they were forked.
+struct Inheritance {
+  const Settings &settings;
+  UniqueFd socket;
+  UniqueFd metrics_socket;
+  std::string form_secret;
+  std::optional<watch::Watch> watch;  ///< Nothing where nobody observes.
+
+  watch::AuditChannel *channel() { return watch ? watch->channel() : nullptr; }
+};
+
 /// Serves until told to stop, then finishes what runs.
 template <typename Server>
-int Work(UniqueFd &socket, const Settings &settings, const std::string &form_secret,
-         WorkerSignals &signals) {
-  Service service(settings, form_secret);
+int Work(Inheritance &common, WorkerSignals &signals) {
+  common.metrics_socket.Reset();
+  if (common.channel() != nullptr) common.channel()->CloseReceiver();
+  const Settings &settings = common.settings;
+  Service service(settings, common.form_secret, common.watch ? &*common.watch : nullptr);
   service.Load();
-  Server server(socket.get(), settings, service);
+  Server server(common.socket.get(), settings, service);
   while (signals.Wait() == WorkerSignals::Kind::RELOAD) service.Load();
   service.BeginStop();
   server.StopAccepting();
-  socket.Reset();
+  common.socket.Reset();
   service.WaitUntilIdle(std::chrono::seconds(settings.stop_timeout));
   return service.ExitStatus();
+}
+
+int ObserveWork(Inheritance &common, WorkerSignals &signals) {
+  common.socket.Reset();
+  return Observe(common.settings, std::move(common.metrics_socket), *common.watch, signals);
+}
+
+void CountLost(Inheritance &common, Task task) {
+  if (!common.watch) return;
+  watch::CounterTable &counters = common.watch->counters().table();
+  watch::Add(task == Task::WORK ? counters.replaced_workers : counters.replaced_observers);
+}
+
+void BeginStop(Inheritance &common) {
+  // New visitors are turned away at once, and not left waiting for nobody.
+  common.socket.Reset();
+  common.metrics_socket.Reset();
+  // So that the observer sees when the last worker has ended.
+  if (common.channel() != nullptr) common.channel()->CloseSender();
+}
+
+int SuperviseWork(Inheritance &common, Mode mode) {
+  Supervision supervision;
+  supervision.workers = common.settings.workers;
+  supervision.has_observer = common.watch.has_value();
+  supervision.stop_timeout = std::chrono::seconds(common.settings.stop_timeout);
+  const auto work = mode == Mode::FASTCGI ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
+  supervision.work = [&common, work](Task task, WorkerSignals &signals) {
+    return task == Task::WORK ? work(common, signals) : ObserveWork(common, signals);
+  };
+  supervision.lost = [&common](Task task) { CountLost(common, task); };
+  supervision.stopping = [&common] { BeginStop(common); };
+  return Supervise(supervision);
 }
 
 int Serve(const Options &options) {
   const Settings &settings = options.settings;
   PrepareSignals();
   RaiseDescriptorLimit();
-  UniqueFd socket = OpenSocket(settings, options.mode);
+  Inheritance common{settings, OpenSocket(settings, options.mode), OpenMetricsSocket(settings), "",
+                     std::nullopt};
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
-  const std::string secret = FormSecret(settings.runtime_folder);
+  common.form_secret = FormSecret(settings.runtime_folder);
   ShareTurns();
-  const bool is_fastcgi = options.mode == Mode::FASTCGI;
-  syslog(LOG_INFO, "%s on %s", is_fastcgi ? "FastCGI" : "HTTP", AddressOf(socket.get()).c_str());
-  const auto work = is_fastcgi ? &Work<FastCgiServer> : &Work<EmbeddedServer>;
-  return Supervise(
-      settings.workers, std::chrono::seconds(settings.stop_timeout),
-      [&](WorkerSignals &signals) { return work(socket, settings, secret, signals); },
-      // New visitors are turned away at once, and not left waiting for nobody.
-      [&] { socket.Reset(); });
+  if (settings.keeps_audit || common.metrics_socket.IsOpen())
+    common.watch.emplace(settings.keeps_audit);
+  syslog(LOG_INFO, "%s on %s", options.mode == Mode::FASTCGI ? "FastCGI" : "HTTP",
+         AddressOf(common.socket.get()).c_str());
+  return SuperviseWork(common, options.mode);
 }
 
 /// The command line is left alone: some web servers put words of the address there.
@@ -93,9 +148,12 @@ int ServeOne() {
   PrepareSignals();
   MakeRuntimeFolder(settings.runtime_folder);
   LimitPrivileges();
-  Service service(settings, FormSecret(settings.runtime_folder));
+  Notebook notebook;
+  Service service(settings, FormSecret(settings.runtime_folder), &notebook);
   service.Load();
-  return ServePlainCgi(service);
+  const int status = ServePlainCgi(service);
+  if (settings.keeps_audit) notebook.Store(settings);
+  return status;
 }
 
 /// What only shows when it is used: the site's texts and templates.

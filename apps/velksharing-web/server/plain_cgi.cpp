@@ -1,5 +1,6 @@
 #include "server/plain_cgi.h"
 
+#include <fcntl.h>
 #include <poll.h>
 #include <unistd.h>
 
@@ -45,6 +46,11 @@ bool Send(Response &response, Visit &visit) {
   return copied.is_whole;
 }
 
+void CloseOutput() {
+  const UniqueFd nothing(open("/dev/null", O_WRONLY | O_CLOEXEC));
+  dup2(nothing.get(), STDOUT_FILENO);
+}
+
 }  // namespace
 
 bool IsPlainCgi() {
@@ -61,9 +67,11 @@ int ServePlainCgi(Service &service) {
   visit.method = cgi.request.method;
   Response response = cgi.refusal == 0 ? service.Answer(cgi.request, visit.note)
                                        : service.Refuse(cgi.request, cgi.refusal);
+  visit.MarkAnswered();
   visit.status = response.status;
   visit.is_whole = Send(response, visit);
   service.End(visit);
+  CloseOutput();
   return visit.is_whole ? kDone : kCut;
 }
 

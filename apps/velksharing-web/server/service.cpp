@@ -6,6 +6,7 @@
 #include <csignal>
 
 #include "http/wipe.h"
+#include "server/testimony.h"
 
 namespace web {
 namespace {
@@ -21,13 +22,18 @@ SiteSettings ForSite(const Settings &settings, std::string form_secret) {
   site.runtime_folder = settings.runtime_folder;
   site.form_secret = std::move(form_secret);
   site.retry_after = settings.retry_after;
+  site.has_gate = settings.auth_address != AuthAddress::OFF;
+  site.guarded = settings.guarded;
   return site;
 }
 
 }  // namespace
 
-Service::Service(const Settings &settings, std::string form_secret)
-    : site_(ForSite(settings, std::move(form_secret))), log_(settings.access_log) {}
+Service::Service(const Settings &settings, std::string form_secret, watch::Witness *witness)
+    : site_(ForSite(settings, std::move(form_secret))),
+      log_(settings.access_log),
+      witness_(witness),
+      address_form_(settings.audit_address) {}
 
 bool Service::Load() {
   std::string error;
@@ -46,6 +52,7 @@ void Service::Begin() {
 
 void Service::End(const Visit &visit) {
   log_.Write(visit);
+  if (witness_ != nullptr) witness_->Count(FinishedOf(visit));
   Drop();
 }
 
@@ -55,6 +62,14 @@ void Service::Drop() {
 }
 
 Response Service::Answer(Request &request, AccessNote &note) {
+  Response response = Handle(request, note);
+  if (witness_ == nullptr) return response;
+  const auto record = AuditRecordOf(note, request.remote_address, address_form_);
+  if (record) witness_->Keep(*record);
+  return response;
+}
+
+Response Service::Handle(Request &request, AccessNote &note) {
   const std::lock_guard guard(site_mutex_);
   Response response = site_.Handle(request, note);
   Wipe(request.body);

@@ -8,6 +8,7 @@
 #include "server/access_log.h"
 #include "server/settings.h"
 #include "site/site.h"
+#include "watch/witness.h"
 
 namespace web {
 
@@ -22,7 +23,8 @@ namespace web {
 class Service {
  public:
   /// @param form_secret as in SiteSettings.
-  Service(const Settings &settings, std::string form_secret);
+  /// @param witness is told of every request; must outlive this. Null for nobody.
+  Service(const Settings &settings, std::string form_secret, watch::Witness *witness = nullptr);
 
   /// Opens the access log and reads the site's texts and templates, or does it again. What cannot
   /// be had stays as it was; the log says so.
@@ -31,12 +33,13 @@ class Service {
 
   /// A request has begun to come in.
   void Begin();
-  /// A request is over: a line for the access log.
+  /// A request is over: a line for the access log, and the witness is told.
   void End(const Visit &visit);
   /// What was begun turned out to be no request.
   void Drop();
 
-  /// Answers a request and wipes its body. Asks this process to stop when it has to be replaced.
+  /// Answers a request, wipes its body, and tells the witness who came or went. Asks this process
+  /// to stop when it has to be replaced.
   Response Answer(Request &request, AccessNote &note);
   /// As Site::Refuse().
   Response Refuse(const Request &request, int status);
@@ -52,9 +55,13 @@ class Service {
   int ExitStatus() const;
 
  private:
+  Response Handle(Request &request, AccessNote &note);
+
   mutable std::mutex site_mutex_;
   Site site_;
   AccessLog log_;
+  watch::Witness *const witness_;
+  const watch::AddressForm address_form_;
 
   mutable std::mutex count_mutex_;
   std::condition_variable is_idle_;

@@ -1,5 +1,6 @@
 #include "server/settings.h"
 
+#include <arpa/inet.h>
 #include <grp.h>
 
 #include <algorithm>
@@ -8,6 +9,7 @@
 #include "common/address.h"
 #include "common/config_file.h"
 #include "server/printable.h"
+#include "site/routes.h"
 
 namespace web {
 namespace {
@@ -17,6 +19,8 @@ using velk::ConfigNumber;
 
 constexpr size_t kLongestSocketPath = 107;
 constexpr size_t kLongestProductName = 200;
+constexpr std::string_view kAuthAddress = "auth_address";
+constexpr std::string_view kProtect = "protect";
 
 bool IsControl(char byte) {
   return static_cast<unsigned char>(byte) < ' ' || byte == '\x7f';
@@ -56,14 +60,25 @@ std::string UrlPath(std::string_view value) {
   return std::string(value);
 }
 
+std::string SocketPath(std::string_view value) {
+  std::string path = AbsolutePath(value);
+  if (path.size() > kLongestSocketPath)
+    throw ConfigMistake("longer than " + std::to_string(kLongestSocketPath) + " bytes");
+  return path;
+}
+
 void SetListen(std::string_view value, Settings &settings) {
   settings.listen = value;
 }
 
+/// "127.0.0.1:9000", "[::1]:9000".
+bool IsOnLoopback(std::string_view value) {
+  return value.starts_with("127.0.0.1:") || value.starts_with("[::1]:");
+}
+
 void SetFastCgi(std::string_view value, Settings &settings) {
-  settings.fastcgi = AbsolutePath(value);
-  if (settings.fastcgi.size() > kLongestSocketPath)
-    throw ConfigMistake("longer than " + std::to_string(kLongestSocketPath) + " bytes");
+  // Whoever speaks FastCGI says who the visitor is.
+  settings.fastcgi = IsOnLoopback(value) ? std::string(value) : SocketPath(value);
 }
 
 void SetSocketMode(std::string_view value, Settings &settings) {
@@ -135,6 +150,74 @@ void SetAccessLog(std::string_view value, Settings &settings) {
   settings.access_log = is_word ? std::string(value) : AbsolutePath(value);
 }
 
+void SetAuthAddress(std::string_view value, Settings &settings) {
+  constexpr std::pair<std::string_view, AuthAddress> kWords[] = {
+      {"off", AuthAddress::OFF},
+      {"parameter", AuthAddress::PARAMETER},
+      {"authorizer", AuthAddress::AUTHORIZER},
+      {"x-forwarded", AuthAddress::X_FORWARDED},
+      {"x-original-url", AuthAddress::X_ORIGINAL_URL},
+  };
+  const auto *word = std::find_if(std::begin(kWords), std::end(kWords),
+                                  [value](const auto &known) { return known.first == value; });
+  if (word == std::end(kWords))
+    throw ConfigMistake("none of off, parameter, authorizer, x-forwarded, x-original-url");
+  settings.auth_address = word->second;
+}
+
+void SetProtect(std::string_view value, Settings &settings) {
+  const std::vector<std::string_view> words = Words(value);
+  if (words.size() != 2) throw ConfigMistake("not a prefix of addresses and the hash of a link");
+  auto prefix = gate::Prefix::Parse(words[0]);
+  if (!prefix) throw ConfigMistake("no prefix of addresses: " + Printable(words[0]));
+  if (!IsHash(words[1])) throw ConfigMistake("no hash of a link: " + Printable(words[1]));
+  settings.guarded.push_back({std::move(*prefix), std::string(words[1])});
+}
+
+bool IsLoopback(const std::string &host) {
+  const auto address = velk::ParseAddress(host.c_str());
+  if (!address) return false;
+  if (address->family == AF_INET6) return IN6_IS_ADDR_LOOPBACK(&address->v6);
+  return ntohl(address->v4.s_addr) >> 24 == IN_LOOPBACKNET;
+}
+
+/// No name is taken either: who knows what it means tomorrow.
+void SetMetricsListen(std::string_view value, Settings &settings) {
+  if (value.front() == '/') {
+    settings.metrics_listen = SocketPath(value);
+    return;
+  }
+  const size_t colon = value.rfind(':');
+  if (colon == std::string_view::npos) throw ConfigMistake("neither ADDRESS:PORT nor a path");
+  std::string host(value.substr(0, colon));
+  if (host.starts_with('[') && host.ends_with(']')) host = host.substr(1, host.size() - 2);
+  if (!IsLoopback(host))
+    throw ConfigMistake("metrics are served on loopback addresses and paths only");
+  ConfigNumber(value.substr(colon + 1), 0, 65535);
+  settings.metrics_listen = value;
+}
+
+void SetAudit(std::string_view value, Settings &settings) {
+  if (value != "on" && value != "off") throw ConfigMistake("neither on nor off");
+  settings.keeps_audit = value == "on";
+}
+
+void SetAuditRetention(std::string_view value, Settings &settings) {
+  settings.audit_retention = static_cast<int>(ConfigNumber(value, 1, 3650));
+}
+
+void SetAuditAddress(std::string_view value, Settings &settings) {
+  if (value == "full") {
+    settings.audit_address = watch::AddressForm::FULL;
+  } else if (value == "network") {
+    settings.audit_address = watch::AddressForm::NETWORK;
+  } else if (value == "none") {
+    settings.audit_address = watch::AddressForm::NONE;
+  } else {
+    throw ConfigMistake("none of full, network, none");
+  }
+}
+
 void SetFileDelivery(std::string_view value, Settings &settings) {
   if (value == "copy") {
     settings.file_delivery = FileDelivery::COPY;
@@ -178,7 +261,13 @@ constexpr Key kKeys[] = {
     {"product_name", SetProductName},
     {"runtime_folder", SetRuntimeFolder},
     {"retry_after", SetRetryAfter},
+    {kAuthAddress, SetAuthAddress},
+    {kProtect, SetProtect},
     {"access_log", SetAccessLog},
+    {"metrics_listen", SetMetricsListen},
+    {"audit", SetAudit},
+    {"audit_retention", SetAuditRetention},
+    {"audit_address", SetAuditAddress},
     {"file_delivery", SetFileDelivery},
     {"file_folders", SetFileFolders},
     {"accel_location", SetAccelLocation},
@@ -201,8 +290,13 @@ void Apply(std::string_view key, std::string_view value, Settings &settings) {
 Settings ReadSettings(const std::string &file) {
   Settings settings;
   velk::ReadConfigFile(
-      file, [&](std::string_view key, std::string_view value) { Apply(key, value, settings); });
+      file, [&](std::string_view key, std::string_view value) { Apply(key, value, settings); },
+      {kProtect});
   return settings;
+}
+
+std::chrono::hours AuditRetention(const Settings &settings) {
+  return std::chrono::hours(24) * settings.audit_retention;
 }
 
 void CheckTogether(const Settings &settings) {
@@ -210,6 +304,12 @@ void CheckTogether(const Settings &settings) {
     throw ConfigMistake("listen and fastcgi exclude each other");
   if (settings.file_delivery != FileDelivery::COPY && settings.file_folders.empty())
     throw ConfigMistake("file_delivery by the web server needs file_folders");
+  const bool asks_by_http = settings.auth_address == AuthAddress::X_FORWARDED ||
+                            settings.auth_address == AuthAddress::X_ORIGINAL_URL;
+  if (asks_by_http && settings.trusted_proxies.empty())
+    throw ConfigMistake("auth_address in header fields needs trusted_proxy");
+  if (settings.auth_address == AuthAddress::OFF && !settings.guarded.empty())
+    throw ConfigMistake("protect needs auth_address");
 }
 
 }  // namespace web

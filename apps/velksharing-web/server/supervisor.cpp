@@ -36,6 +36,10 @@ sigset_t SignalSet() {
   return set;
 }
 
+const char *Name(Task task) {
+  return task == Task::WORK ? "worker" : "observer";
+}
+
 std::string Ending(int status) {
   if (WIFSIGNALED(status))
     return std::string("was ended by signal ") + std::to_string(WTERMSIG(status)) + " (" +
@@ -43,8 +47,9 @@ std::string Ending(int status) {
   return "ended with status " + std::to_string(WEXITSTATUS(status));
 }
 
-/// One worker's place.
+/// One child's place.
 struct Slot {
+  Task task = Task::WORK;
   pid_t pid = 0;  ///< 0: nobody there.
   Clock::time_point started;
   Clock::time_point due;  ///< When the next one may start.
@@ -53,15 +58,14 @@ struct Slot {
 
 class Supervisor {
  public:
-  Supervisor(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work,
-             const std::function<void()> &stopping);
+  explicit Supervisor(const Supervision &supervision);
 
   int Run();
 
  private:
   void StartDue();
   void Start(Slot &slot);
-  [[noreturn]] void BecomeWorker();
+  [[noreturn]] void BecomeChild(Task task);
   void Reap();
   void Vacate(Slot &slot, int status);
   void Stop();
@@ -70,10 +74,8 @@ class Supervisor {
   Clock::time_point NextDue() const;
 
   std::vector<Slot> slots_;
-  const seconds stop_timeout_;
-  const std::function<int(WorkerSignals &)> &work_;
-  const std::function<void()> &stopping_;
-  UniqueFd lifeline_;  ///< What workers hold.
+  const Supervision &supervision_;
+  UniqueFd lifeline_;  ///< What children hold.
   UniqueFd hold_;      ///< Closes when this process ends, however it does.
   bool is_stopping_ = false;
 };
@@ -88,13 +90,9 @@ int NextSignal(Clock::time_point until) {
   return signal < 0 ? 0 : signal;
 }
 
-Supervisor::Supervisor(int workers, seconds stop_timeout,
-                       const std::function<int(WorkerSignals &)> &work,
-                       const std::function<void()> &stopping)
-    : slots_(static_cast<size_t>(workers)),
-      stop_timeout_(stop_timeout),
-      work_(work),
-      stopping_(stopping) {
+Supervisor::Supervisor(const Supervision &supervision)
+    : slots_(static_cast<size_t>(supervision.workers)), supervision_(supervision) {
+  if (supervision.has_observer) slots_.emplace_back().task = Task::OBSERVE;
   int ends[2] = {};
   if (pipe2(ends, O_CLOEXEC) != 0) throw std::runtime_error("no pipe for the workers");
   lifeline_.Reset(ends[0]);
@@ -127,21 +125,21 @@ void Supervisor::StartDue() {
 void Supervisor::Start(Slot &slot) {
   slot.started = Clock::now();
   const pid_t pid = fork();
-  if (pid == 0) BecomeWorker();
+  if (pid == 0) BecomeChild(slot.task);
   if (pid > 0) {
     slot.pid = pid;
     return;
   }
-  syslog(LOG_ERR, "cannot start a worker: %s", strerror(errno));
+  syslog(LOG_ERR, "cannot start a %s: %s", Name(slot.task), strerror(errno));
   slot.pause = kLongestPause;
   slot.due = Clock::now() + slot.pause;
 }
 
-void Supervisor::BecomeWorker() {
+void Supervisor::BecomeChild(Task task) {
   hold_.Reset();
   try {
     WorkerSignals signals(std::move(lifeline_));
-    _exit(work_(signals));
+    _exit(supervision_.work(task, signals));
   } catch (const std::exception &error) {
     syslog(LOG_ERR, "%s", error.what());
     _exit(kBroken);
@@ -165,19 +163,20 @@ void Supervisor::Vacate(Slot &slot, int status) {
   slot.pause =
       lived_long ? milliseconds{0} : std::clamp(slot.pause * 2, kShortestPause, kLongestPause);
   slot.due = Clock::now() + slot.pause;
-  syslog(LOG_WARNING, "worker %d %s; another one starts in %ld ms", static_cast<int>(pid),
-         Ending(status).c_str(), static_cast<long>(slot.pause.count()));
+  supervision_.lost(slot.task);
+  syslog(LOG_WARNING, "%s %d %s; another one starts in %ld ms", Name(slot.task),
+         static_cast<int>(pid), Ending(status).c_str(), static_cast<long>(slot.pause.count()));
 }
 
 void Supervisor::Stop() {
   is_stopping_ = true;
-  stopping_();
+  supervision_.stopping();
   Forward(SIGTERM);
-  const Clock::time_point end = Clock::now() + stop_timeout_ + kBeyondTimeout;
+  const Clock::time_point end = Clock::now() + supervision_.stop_timeout + kBeyondTimeout;
   while (Reap(), IsAnyoneThere()) {
     const int signal = NextSignal(end);
     if (signal == SIGCHLD || signal == SIGHUP) continue;
-    syslog(LOG_WARNING, "killing the workers that are still busy");
+    syslog(LOG_WARNING, "killing the processes that are still busy");
     Forward(SIGKILL);
     while (wait(nullptr) > 0) {
     }
@@ -222,9 +221,8 @@ WorkerSignals::Kind WorkerSignals::Wait() {
   return signal.ssi_signo == SIGHUP ? Kind::RELOAD : Kind::STOP;
 }
 
-int Supervise(int workers, seconds stop_timeout, const std::function<int(WorkerSignals &)> &work,
-              const std::function<void()> &stopping) {
-  return Supervisor(workers, stop_timeout, work, stopping).Run();
+int Supervise(const Supervision &supervision) {
+  return Supervisor(supervision).Run();
 }
 
 void PrepareSignals() {

@@ -28,18 +28,33 @@ class WorkerSignals {
   UniqueFd lifeline_;
 };
 
-/// Runs worker processes and replaces those that end before they are told to: at once when one has
-/// lived for a while, else after a pause that doubles from 0.1 to 10 seconds. SIGHUP is passed on.
-/// SIGTERM and SIGINT stop the workers; those that are not done some seconds after `stop_timeout`,
-/// or at a second signal, are killed.
+/// What a child process is for.
+enum class Task {
+  WORK,    ///< Serves visitors.
+  OBSERVE  ///< Tells about it.
+};
+
+/// What a supervisor does.
+struct Supervision {
+  int workers = 1;
+  bool has_observer = false;
+  std::chrono::seconds stop_timeout{30};
+  /// What a child does; its result is the child's exit status.
+  std::function<int(Task, WorkerSignals &)> work;
+  /// Called in the supervisor when a child has ended unasked.
+  std::function<void(Task)> lost;
+  /// Called in the supervisor when it begins to stop.
+  std::function<void()> stopping;
+};
+
+/// Runs worker processes, and an observer where one is wanted, and replaces those that end before
+/// they are told to: at once when one has lived for a while, else after a pause that doubles from
+/// 0.1 to 10 seconds. SIGHUP is passed on. SIGTERM and SIGINT stop them; those that are not done
+/// some seconds after `stop_timeout`, or at a second signal, are killed.
 ///
 /// To be called while the process has one thread.
-/// @param work what a worker does; its result is the worker's exit status.
-/// @param stopping called in the supervisor when it begins to stop.
 /// @return the supervisor's exit status.
-int Supervise(int workers, std::chrono::seconds stop_timeout,
-              const std::function<int(WorkerSignals &)> &work,
-              const std::function<void()> &stopping);
+int Supervise(const Supervision &supervision);
 
 /// Blocks the signals that supervisor and workers wait for, and ignores SIGPIPE. For the first
 /// thread, before there are others.

@@ -11,6 +11,8 @@
 namespace web {
 namespace {
 
+const std::string kUnix = "unix";
+
 /// All fields of a name as one list, in their order.
 std::string Joined(const Fields &fields, const char *name) {
   std::string list;
@@ -34,7 +36,7 @@ TrustedProxies::TrustedProxies(std::vector<std::string> peers) : peers_(std::mov
 
 bool TrustedProxies::Identify(const std::string &peer, Request &request) const {
   request.remote_address = peer;
-  if (!Trusts(peer.empty() ? "unix" : peer)) return !peer.empty();
+  if (!Trusts(peer)) return !peer.empty();
 
   request.is_https = request.headers.Get("X-Forwarded-Proto") == "https";
   // Each proxy adds the one that it heard from at the end. What lies before the first that is not
@@ -50,7 +52,8 @@ bool TrustedProxies::Identify(const std::string &peer, Request &request) const {
 }
 
 bool TrustedProxies::Trusts(const std::string &peer) const {
-  return std::find(peers_.begin(), peers_.end(), peer) != peers_.end();
+  const std::string &name = peer.empty() ? kUnix : peer;
+  return std::find(peers_.begin(), peers_.end(), name) != peers_.end();
 }
 
 }  // namespace web

@@ -21,9 +21,10 @@ class TrustedProxies {
   /// @return false when there is no address to be had: the request cannot be served.
   bool Identify(const std::string &peer, Request &request) const;
 
- private:
+  /// Whether the word of `peer` counts; "" for a socket that has a path.
   bool Trusts(const std::string &peer) const;
 
+ private:
   std::vector<std::string> peers_;
 };
 

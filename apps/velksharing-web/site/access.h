@@ -25,6 +25,21 @@ struct Checked {
 /// lock is taken and given back once.
 Checked Authorize(const std::string &hash, const std::string &session_id);
 
+/// What a visitor has at a link.
+struct Grant {
+  unsigned int uid = 0;  ///< The account's; UID_ERR for none.
+  long remaining = 0;    ///< Seconds until it ends, if it is not used again before.
+};
+
+/// What came of a check, with the grant that it found and prolonged.
+struct GrantChecked {
+  Result result;               ///< The code is a VelkSharingAuthResult.
+  std::optional<Grant> grant;  ///< Nothing unless the visitor is authorised.
+};
+
+/// As Authorize().
+GrantChecked AuthorizeGrant(const std::string &hash, const std::string &session_id);
+
 /// Logs a visitor in by what a form says. Makes a new session always: one that the browser brought
 /// may have been put there by somebody else.
 /// @param keep_block_state whether the address's earlier failures stay. They must where a login

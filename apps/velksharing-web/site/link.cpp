@@ -2,8 +2,8 @@
 
 #include <syslog.h>
 #include <velksharing/database.h>
-#include <velksharing/store.h>
 
+#include <algorithm>
 #include <utility>
 
 #include "site/redirect_target.h"
@@ -11,7 +11,6 @@
 namespace web {
 namespace {
 
-using VELK::sharing::db::EntryDB;
 using VELK::sharing::db::Result;
 using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
@@ -63,23 +62,25 @@ bool Link::CanDownload() const {
   return !(hidden.isBool() && hidden.asBool());
 }
 
-std::optional<Link> OpenLink(Entry entry, const std::vector<std::string> &parts) {
+std::optional<Link> OpenLink(Entry entry, const std::vector<std::string> &parts,
+                             std::vector<gate::Prefix> prefixes) {
   Link link;
   link.entry = std::move(entry);
+  link.prefixes = std::move(prefixes);
   ReadRedirect(link);
-  if (link.target.empty() && !OpenTree(link, parts)) return std::nullopt;
+  const bool has_tree = link.target.empty() && OpenTree(link, parts);
+  if (!has_tree && link.target.empty() && link.prefixes.empty()) return std::nullopt;
   return link;
 }
 
-std::optional<Link> FindLink(const std::string &hash, const std::vector<std::string> &parts) {
-  Entry entry;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, entry)) return std::nullopt;
-  return OpenLink(std::move(entry), parts);
+bool AdmitsVisitors(const Entry &link) {
+  if (!link.IsValid()) return false;
+  const int limit = link.get_expire_times();
+  return limit <= 0 || link.get_use_count() < limit;
 }
 
-bool AdmitsVisitors(const Link &link) {
-  if (!link.entry.IsValid()) return false;
-  return !link.HasUseLimit() || link.entry.get_use_count() < link.entry.get_expire_times();
+std::string ShortenedHash(const std::string &hash) {
+  return hash.empty() ? "" : hash.substr(0, std::min<size_t>(3, hash.size() / 2)) + "…";
 }
 
 bool DatabaseAnswers() {

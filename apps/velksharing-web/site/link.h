@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "gate/prefix.h"
 #include "share/shared_tree.h"
 
 namespace web {
@@ -18,7 +19,9 @@ struct Link {
   std::string target;
   /// Where the page offers to go on; "" for nowhere.
   std::string continue_to;
-  /// Open unless `target` is set.
+  /// What it guards.
+  std::vector<gate::Prefix> prefixes;
+  /// Open where there is something to look at: not when `target` is set.
   std::optional<share::SharedTree> tree;
   /// What was asked for in the tree, where it is there.
   std::optional<share::Item> item;
@@ -29,19 +32,21 @@ struct Link {
   bool CanDownload() const;
 };
 
-/// Opens what a link has for visitors.
+/// Opens what a link has for visitors. Whether it is enabled, has started and the like is not
+/// looked at.
 /// @param parts what is asked for in a folder: names from the top down.
+/// @param prefixes what the link guards, which is enough for a visitor, too.
 /// @return nothing for a link that has nothing to show: its owner is gone, or cannot read what it
-///         shares. Whether it is enabled, has started and the like is not looked at.
+///         shares.
 std::optional<Link> OpenLink(VELK::sharing::record::Entry entry,
-                             const std::vector<std::string> &parts);
-
-/// Looks a link up by its hash, and opens it.
-/// @return nothing also for a link that does not exist or cannot be read back.
-std::optional<Link> FindLink(const std::string &hash, const std::vector<std::string> &parts = {});
+                             const std::vector<std::string> &parts,
+                             std::vector<gate::Prefix> prefixes);
 
 /// Whether a link lets new visitors in now.
-bool AdmitsVisitors(const Link &link);
+bool AdmitsVisitors(const VELK::sharing::record::Entry &link);
+
+/// Enough of a hash to find a visitor's requests together, too little to open the link.
+std::string ShortenedHash(const std::string &hash);
 
 /// Whether the database answers at all.
 bool DatabaseAnswers();

@@ -2,12 +2,15 @@
 
 #include <velksharing/access.h>
 #include <velksharing/constants.h>
+#include <velksharing/database.h>
+#include <velksharing/store.h>
 
 #include <optional>
 #include <thread>
 #include <utility>
 
 #include "site/access.h"
+#include "site/event_note.h"
 #include "site/result_names.h"
 #include "site/use_lock.h"
 
@@ -15,6 +18,8 @@ namespace web {
 namespace {
 
 using std::chrono::milliseconds;
+using VELK::sharing::db::EntryDB;
+using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
 
 /// How long a link that lets nobody in takes to say so. More than any of the reasons needs, so
@@ -39,12 +44,20 @@ Result LoginResult(int code) {
   return {code, LoginResultName(code)};
 }
 
+/// Where a visitor goes on to as soon as he is in; "" when he stays.
+std::string DestinationOf(const Link &link, const WayBack &way_back) {
+  if (!way_back.wanted().empty()) return way_back.wanted();
+  if (!link.target.empty() || link.tree) return link.target;
+  return way_back.Default();
+}
+
 }  // namespace
 
 LinkVisit::LinkVisit(const SiteParts &site, const Answers &answers, const Request &request,
                      const std::string &hash, AccessNote &note)
     : site_(site),
       answers_(answers),
+      request_(request),
       hash_(hash),
       address_(site.settings.base_path + "/" + hash),
       visitor_(request, site.tokens, hash_, address_),
@@ -52,13 +65,13 @@ LinkVisit::LinkVisit(const SiteParts &site, const Answers &answers, const Reques
 
 Response LinkVisit::Look(const SharedRequest &wanted) {
   note_.route = "page";
-  if (visitor_.session_id().empty()) return LookFromOutside(FindLink(hash_, wanted.parts), wanted);
+  if (visitor_.session_id().empty()) return LookFromOutside(FindLink(wanted.parts), wanted);
   Checked checked = Authorize(hash_, visitor_.session_id());
   const Result &result = Noted(checked.result);
   std::optional<Link> link;
   if (checked.link) link = OpenLink(std::move(*checked.link), wanted.parts);
   if (result.code == VELK_SHARING_AUTH_OK)
-    return link ? Show(*link, wanted) : Hidden(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
+    return link ? ShowAgain(*link, wanted) : Hidden(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (result.code == VELK_SHARING_AUTH_UNUSABLE && !(link && MayLackItsAccount(*link)))
     return Unavailable(result);
   return LookFromOutside(std::move(link), wanted);
@@ -66,12 +79,13 @@ Response LinkVisit::Look(const SharedRequest &wanted) {
 
 Response LinkVisit::LogIn(const Form &form) {
   note_.route = "login";
-  const std::optional<Link> link = FindLink(hash_);
-  if (!link || !AdmitsVisitors(*link)) return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
+  const std::optional<Link> link = FindLink();
+  if (!link || !AdmitsVisitors(link->entry)) return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
   if (!visitor_.HasRightForm(form))
     return Entrance(*link, 403, LoginProblem::kFormExpired, Result{});
   Secret session_id;
   const Result result = Noted(LogInOneByOne(*link, form, session_id.text()));
+  NoteLogin(*link, session_id.text(), note_);
   if (result.code != VELK_SHARING_LOGIN_OK) return RefusedLogin(*link, result, form);
   return Welcome(*link, result, session_id.text());
 }
@@ -80,15 +94,30 @@ Response LinkVisit::LogOut(const Form &form) {
   note_.route = "logout";
   if (!visitor_.HasRightForm(form)) return answers_.Error(403);
   const Result result = Noted(web::LogOut(hash_, visitor_.session_id()));
+  NoteLogout(hash_, visitor_.session_id(), note_);
   Response response = answers_.wants_json()
                           ? answers_.Json(result.code == 1 ? 200 : 401, result)
                           : answers_.SeeOther(address_ + "?" + kFarewellParameter);
   visitor_.ForgetSession(response);
+  if (const std::optional<Link> link = FindLink())
+    visitor_.ForgetGuardSession(response, WayBackFor(*link).CookiePath());
   return response;
 }
 
+std::optional<Link> LinkVisit::FindLink(const std::vector<std::string> &parts) const {
+  Entry entry;
+  if (!EntryDB(SharingDB::Instance()).GetByHash(hash_, entry)) return std::nullopt;
+  return OpenLink(std::move(entry), parts);
+}
+
+std::optional<Link> LinkVisit::OpenLink(Entry entry, const std::vector<std::string> &parts) const {
+  std::vector<gate::Prefix> prefixes;
+  if (site_.settings.has_gate) prefixes = site_.guards.PrefixesOf(entry);
+  return web::OpenLink(std::move(entry), parts, std::move(prefixes));
+}
+
 Response LinkVisit::LookFromOutside(std::optional<Link> link, const SharedRequest &wanted) {
-  if (!link || !AdmitsVisitors(*link)) return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
+  if (!link || !AdmitsVisitors(link->entry)) return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (wanted.query.Has(kFarewellParameter) && !answers_.wants_json()) return Farewell(*link);
   if (link->IsOpen() && !link->HasUseLimit() && !visitor_.OnlyPeeks())
     return EnterByLooking(*link, wanted);
@@ -100,9 +129,11 @@ Response LinkVisit::EnterByLooking(Link &link, const SharedRequest &wanted) {
   const Form nothing;
   Secret session_id;
   const Result result = Noted(LogInOneByOne(link, nothing, session_id.text()));
+  NoteLogin(link, session_id.text(), note_);
   if (result.code != VELK_SHARING_LOGIN_OK) return RefusedLogin(link, result, nothing);
   Response response = Show(link, wanted);
   visitor_.KeepSession(response, session_id.text());
+  visitor_.KeepGuardSession(response, session_id.text(), WayBackFor(link).CookiePath());
   return response;
 }
 
@@ -113,8 +144,16 @@ Result LinkVisit::LogInOneByOne(const Link &link, const Form &form, std::string 
   return web::LogIn(hash_, form, link.IsOpen(), session_id);
 }
 
+Response LinkVisit::ShowAgain(Link &link, const SharedRequest &wanted) {
+  Response response = Show(link, wanted);
+  if (response.status == 303)
+    visitor_.KeepGuardSession(response, visitor_.session_id(), WayBackFor(link).CookiePath());
+  return response;
+}
+
 Response LinkVisit::Show(Link &link, const SharedRequest &wanted) {
-  if (!link.target.empty()) return SendOn(link);
+  const std::string target = DestinationOf(link, WayBackFor(link));
+  if (!target.empty()) return SendOn(target);
   // A token costs more than a small file.
   const Reader reader = wanted.AsksForBytes() ? Reader{answers_.language(), ""} : FormReader();
   const SharedView view = {ViewOf(link), reader, address_, link.CanDownload()};
@@ -124,26 +163,29 @@ Response LinkVisit::Show(Link &link, const SharedRequest &wanted) {
   return response;
 }
 
-Response LinkVisit::SendOn(const Link &link) {
+Response LinkVisit::SendOn(const std::string &target) {
   note_.route = "redirect";
-  if (!answers_.wants_json()) return answers_.SeeOther(link.target);
+  if (!answers_.wants_json()) return answers_.SeeOther(target);
   Json::Value document = JsonOf(CheckResult(VELK_SHARING_AUTH_OK));
-  document["redirect"] = link.target;
+  document["redirect"] = target;
   return answers_.Json(200, document);
 }
 
 Response LinkVisit::Welcome(const Link &link, const Result &result,
                             const std::string &session_id) const {
+  const WayBack way_back = WayBackFor(link);
+  const std::string target = DestinationOf(link, way_back);
   Response response;
   if (answers_.wants_json()) {
     response = answers_.Json(200, result);
-  } else if (!link.target.empty()) {
-    // Browsers let a form lead to our own site only, and redirects behind it, too.
-    response = answers_.Page(200, site_.pages.Continue(FormReader(), ViewOf(link), link.target));
+  } else if (target.empty() || target.front() == '/') {
+    response = answers_.SeeOther(target.empty() ? address_ : target);
   } else {
-    response = answers_.SeeOther(address_);
+    // Browsers let a form lead to our own site only, and redirects behind it, too.
+    response = answers_.Page(200, site_.pages.Continue(FormReader(), ViewOf(link), target));
   }
   visitor_.KeepSession(response, session_id);
+  visitor_.KeepGuardSession(response, session_id, way_back.CookiePath());
   return response;
 }
 
@@ -155,8 +197,8 @@ Response LinkVisit::RefusedLogin(const Link &link, const Result &result, const F
       return AskAgain(link, result, form);
     case VELK_SHARING_LOGIN_REFUSED: {
       // Nothing was typed; or the link was switched off at this moment.
-      const std::optional<Link> now = FindLink(hash_);
-      return now && AdmitsVisitors(*now) ? AskAgain(*now, result, form) : Absent(result);
+      const std::optional<Link> now = FindLink();
+      return now && AdmitsVisitors(now->entry) ? AskAgain(*now, result, form) : Absent(result);
     }
     case VELK_SHARING_LOGIN_USED_UP:
       return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
@@ -175,7 +217,7 @@ Response LinkVisit::AskAgain(const Link &link, const Result &result, const Form 
 Response LinkVisit::Entrance(const Link &link, int status, LoginProblem problem,
                              const Result &result, const std::string &account) const {
   if (answers_.wants_json()) return answers_.Error(status, result);
-  const LoginView view = {ViewOf(link), problem, account};
+  const LoginView view = {ViewOf(link), problem, account, WayBackFor(link).wanted()};
   Response response = answers_.Page(status, EntrancePage(link, view));
   visitor_.KeepFormKey(response);
   return response;
@@ -216,6 +258,10 @@ const Result &LinkVisit::Noted(const Result &result) {
   note_.code = result.code;
   note_.code_name = result.name;
   return result;
+}
+
+WayBack LinkVisit::WayBackFor(const Link &link) const {
+  return {request_, Form::Parse(request_.query).value_or(Form()), link.prefixes};
 }
 
 LinkView LinkVisit::ViewOf(const Link &link) const {

@@ -11,10 +11,12 @@
 #include "pages/pages.h"
 #include "site/answers.h"
 #include "site/form_token.h"
+#include "site/guards.h"
 #include "site/link.h"
 #include "site/shared_answers.h"
 #include "site/site.h"
 #include "site/visitor.h"
+#include "site/way_back.h"
 
 namespace web {
 
@@ -23,6 +25,7 @@ struct SiteParts {
   const SiteSettings &settings;
   const Pages &pages;
   const FormTokens &tokens;
+  const Guards &guards;
 };
 
 /// One request to one link, which is the platform's current request meanwhile.
@@ -47,13 +50,20 @@ class LinkVisit {
   Response LogOut(const Form &form);
 
  private:
+  // The link.
+  std::optional<Link> FindLink(const std::vector<std::string> &parts = {}) const;
+  std::optional<Link> OpenLink(VELK::sharing::record::Entry entry,
+                               const std::vector<std::string> &parts) const;
+
   // Ways in, and what is behind.
   Response LookFromOutside(std::optional<Link> link, const SharedRequest &wanted);
   Response EnterByLooking(Link &link, const SharedRequest &wanted);
   Result LogInOneByOne(const Link &link, const Form &form, std::string &session_id);
+  /// For somebody who brought his session. What the link guards may not have seen it yet.
+  Response ShowAgain(Link &link, const SharedRequest &wanted);
   /// Takes the link's item.
   Response Show(Link &link, const SharedRequest &wanted);
-  Response SendOn(const Link &link);
+  Response SendOn(const std::string &target);
   Response Welcome(const Link &link, const Result &result, const std::string &session_id) const;
 
   // Pages for those who are outside.
@@ -70,12 +80,14 @@ class LinkVisit {
   Response Unavailable(const Result &result) const;
 
   const Result &Noted(const Result &result);
+  WayBack WayBackFor(const Link &link) const;
   LinkView ViewOf(const Link &link) const;
   Reader FormReader() const;
 
   const std::chrono::steady_clock::time_point start_ = std::chrono::steady_clock::now();
   const SiteParts site_;
   const Answers &answers_;
+  const Request &request_;
   const std::string &hash_;
   const std::string address_;
   const Visitor visitor_;

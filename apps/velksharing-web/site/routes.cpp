@@ -12,15 +12,15 @@ namespace {
 
 constexpr size_t kLongestHash = 64;
 
-bool IsHash(std::string_view text) {
-  return !text.empty() && text.size() <= kLongestHash && std::ranges::all_of(text, IsLetterOrDigit);
-}
-
 bool IsHealth(std::string_view below, bool is_at_root) {
   return below == (is_at_root ? "/-health" : "-health");
 }
 
 }  // namespace
+
+bool IsHash(std::string_view text) {
+  return !text.empty() && text.size() <= kLongestHash && std::ranges::all_of(text, IsLetterOrDigit);
+}
 
 bool Route::IsLogout() const {
   return kind == LINK && !ends_with_slash && parts.size() == 1 && parts[0] == "logout";

@@ -25,6 +25,9 @@ struct Route {
   bool IsLogout() const;
 };
 
+/// Whether a text can be the hash of a link: 1 to 64 letters and digits.
+bool IsHash(std::string_view text);
+
 /// Reads the path of a request. Whatever is not one of these addresses is NOWHERE.
 /// @param base_path as in SiteSettings.
 Route FindRoute(std::string_view base_path, std::string_view path);

@@ -16,6 +16,8 @@
 #include "site/answers.h"
 #include "site/cgi_environment.h"
 #include "site/form_token.h"
+#include "site/gatekeeper.h"
+#include "site/guards.h"
 #include "site/link.h"
 #include "site/link_visit.h"
 #include "site/routes.h"
@@ -35,11 +37,6 @@ PagesSettings PagesSettingsOf(const SiteSettings &settings) {
   pages.account_field = VELK::sharing::SZK_ZED_USERNAME;
   pages.account_password_field = VELK::sharing::SZK_ZED_PASSWORD;
   return pages;
-}
-
-/// Enough to find a visitor's requests together, too little to open the link.
-std::string Shortened(const std::string &hash) {
-  return hash.empty() ? "" : hash.substr(0, std::min<size_t>(3, hash.size() / 2)) + "…";
 }
 
 bool IsFormType(std::string_view content_type) {
@@ -76,7 +73,9 @@ class SitePrivate {
   explicit SitePrivate(SiteSettings settings)
       : settings_(std::move(settings)),
         pages_(PagesSettingsOf(settings_)),
-        tokens_(settings_.form_secret) {}
+        tokens_(settings_.form_secret),
+        guards_(settings_.guarded),
+        gatekeeper_(settings_, pages_, guards_) {}
   ~SitePrivate() { Wipe(settings_.form_secret); }
 
   Response Answer(const Request &request, AccessNote &note);
@@ -94,15 +93,21 @@ class SitePrivate {
   SiteSettings settings_;
   Pages pages_;
   const FormTokens tokens_;
+  Guards guards_;
+  const Gatekeeper gatekeeper_;
   bool has_asked_database_ = false;
 };
 
 Response SitePrivate::Answer(const Request &request, AccessNote &note) {
   const Answers answers(pages_, request);
+  if (request.question) {
+    has_asked_database_ = true;
+    return gatekeeper_.Answer(answers, request, note);
+  }
   const Route route = FindRoute(settings_.base_path, request.path);
   if (route.kind == Route::LINK) {
     has_asked_database_ = true;
-    note.link = Shortened(route.hash);
+    note.link = ShortenedHash(route.hash);
     return AnswerLink(answers, request, route, note);
   }
   if (!IsReading(request)) return MethodNotAllowed(answers, "GET, HEAD");
@@ -132,7 +137,7 @@ Response SitePrivate::AnswerLink(const Answers &answers, const Request &request,
   if (!IsReading(request) && !(takes_forms && request.method == "POST"))
     return MethodNotAllowed(answers, takes_forms ? "GET, HEAD, POST" : "GET, HEAD");
   const PlatformRequest current(request);
-  LinkVisit visit({settings_, pages_, tokens_}, answers, request, route.hash, note);
+  LinkVisit visit({settings_, pages_, tokens_, guards_}, answers, request, route.hash, note);
   if (!IsReading(request)) return AnswerForm(answers, request, route, visit);
   const std::optional<Form> query = Form::Parse(request.query);
   if (!query) return answers.Error(400);

@@ -2,8 +2,11 @@
 #define VELKSHARING_WEB_SITE_SITE_H
 
 #include <memory>
+#include <optional>
 #include <string>
+#include <vector>
 
+#include "gate/guarded_prefix.h"
 #include "http/request.h"
 #include "http/response.h"
 
@@ -29,12 +32,24 @@ struct SiteSettings {
   std::string form_secret;
   /// Seconds after which a blocked visitor is told to try again.
   long retry_after = 600;
+  /// Whether links guard addresses of other servers, who ask here.
+  bool has_gate = false;
+  /// What links guard by the configuration's word; by their own they may guard more.
+  std::vector<gate::GuardedPrefix> guarded{};
 };
 
-/// What the access log may say about a request: nothing secret, nothing that opens a link.
+/// What the access log, the counters and the audit trail may say about a request: nothing secret,
+/// nothing that opens a link.
 struct AccessNote {
-  /// What the request was about: "page", "folder", "file", "download", "view", "thumbnail", "zip",
-  /// "redirect", "login", "logout", "asset", "health" or "none".
+  /// A visitor's coming and going, which the audit trail keeps.
+  enum class Event {
+    NONE,
+    LOGIN,  ///< The access API was asked to log a visitor in who had to show something.
+    ENTER,  ///< The same for a link that asks for nothing.
+    LOGOUT
+  };
+
+  /// What the request was about: one of kRouteNames (site/route_names.h).
   std::string route = "none";
   /// The link's hash, shortened to its first three characters and "…" (less of a hash that is
   /// short); "" for none. The shared path is left out: file names are the owner's business.
@@ -43,6 +58,12 @@ struct AccessNote {
   int code = 0;
   /// The code's name in velksharing/access.h; "" when it was not asked.
   std::string code_name;
+  /// What `code` answers, when it was a coming or going.
+  Event event = Event::NONE;
+  /// Row id of the link that it was about; 0 for none.
+  int entry_id = 0;
+  /// Account of the session that was made or left; none where a link asks for no account.
+  std::optional<unsigned int> uid;
 };
 
 /// The visitors' side of every link: a request goes in, a response comes out. It knows no server.

@@ -2,34 +2,15 @@
 
 #include <velksharing/constants.h>
 
-#include <algorithm>
 #include <string_view>
 
 #include "http/cookies.h"
-#include "http/text.h"
-#include "site/cgi_environment.h"
+#include "site/session_ids.h"
 
 namespace web {
 namespace {
 
 constexpr char kFormKeyCookie[] = "sharing_csrf";
-constexpr size_t kLongestSessionId = 128;
-
-/// The field in which API clients send a session's identifier; null when there is none.
-const std::string *FindSessionField(const Request &request) {
-  for (const auto &[name, value] : request.headers)
-    if (CgiName(name) == SZ_X_SHARING_HEADER) return &value;
-  return nullptr;
-}
-
-bool IsSessionIdByte(char byte) {
-  return IsLetterOrDigit(byte) || byte == '-' || byte == '_';
-}
-
-bool IsSessionId(std::string_view text) {
-  return !text.empty() && text.size() <= kLongestSessionId &&
-         std::ranges::all_of(text, IsSessionIdByte);
-}
 
 std::string_view ClaimedSessionId(const Request &request) {
   const std::string *field = FindSessionField(request);
@@ -82,27 +63,38 @@ bool Visitor::HasRightForm(const Form &form) const {
 }
 
 void Visitor::KeepFormKey(Response &response) const {
-  if (brought_form_key_.empty()) AddCookie(response, kFormKeyCookie, form_key_, false);
+  if (brought_form_key_.empty())
+    AddCookie(response, kFormKeyCookie, form_key_, address_, Fate::KEPT);
 }
 
 bool Visitor::KeepSession(Response &response, const std::string &session_id) const {
   if (!IsSessionId(session_id)) return false;
-  AddCookie(response, VELK::sharing::SZK_SHARING_SID, session_id, false);
+  AddCookie(response, VELK::sharing::SZK_SHARING_SID, session_id, address_, Fate::KEPT);
   return true;
 }
 
 void Visitor::ForgetSession(Response &response) const {
-  AddCookie(response, VELK::sharing::SZK_SHARING_SID, "", true);
+  AddCookie(response, VELK::sharing::SZK_SHARING_SID, "", address_, Fate::WITHDRAWN);
 }
 
-void Visitor::AddCookie(Response &response, const char *name, const std::string &value,
-                        bool is_withdrawn) const {
+void Visitor::KeepGuardSession(Response &response, const std::string &session_id,
+                               const std::string &path) const {
+  if (!path.empty() && IsSessionId(session_id))
+    AddCookie(response, GuardCookieName(hash_), session_id, path, Fate::KEPT);
+}
+
+void Visitor::ForgetGuardSession(Response &response, const std::string &path) const {
+  if (!path.empty()) AddCookie(response, GuardCookieName(hash_), "", path, Fate::WITHDRAWN);
+}
+
+void Visitor::AddCookie(Response &response, const std::string &name, const std::string &value,
+                        const std::string &path, Fate fate) const {
   Cookie cookie;
   cookie.name = name;
   cookie.value = value;
-  cookie.path = address_;
+  cookie.path = path;
   cookie.is_secure = request_.is_https;
-  cookie.is_withdrawn = is_withdrawn;
+  cookie.is_withdrawn = fate == Fate::WITHDRAWN;
   response.headers.Add("Set-Cookie", SetCookieText(cookie));
 }
 

@@ -47,9 +47,16 @@ class Visitor {
   /// Makes the browser forget its session.
   void ForgetSession(Response &response) const;
 
+  /// Gives the browser a session for what the link guards, below this path; "" for nothing.
+  void KeepGuardSession(Response &response, const std::string &session_id,
+                        const std::string &path) const;
+  /// Makes the browser forget that one.
+  void ForgetGuardSession(Response &response, const std::string &path) const;
+
  private:
-  void AddCookie(Response &response, const char *name, const std::string &value,
-                 bool is_withdrawn) const;
+  enum class Fate { KEPT, WITHDRAWN };
+  void AddCookie(Response &response, const std::string &name, const std::string &value,
+                 const std::string &path, Fate fate) const;
 
   const Request &request_;
   const FormTokens &tokens_;

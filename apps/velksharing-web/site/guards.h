@@ -1,0 +1,56 @@
+#ifndef VELKSHARING_WEB_SITE_GUARDS_H
+#define VELKSHARING_WEB_SITE_GUARDS_H
+
+#include <velksharing/record.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include "gate/address.h"
+#include "gate/guarded_prefix.h"
+#include "gate/prefix.h"
+#include "gate/prefix_map.h"
+
+namespace web {
+
+/// Which links guard which addresses: those that say so themselves (`app.protects`, an array of
+/// prefixes), and those that the configuration names. Works on the database of this process.
+///
+/// The links' own word is read from the database at each Refresh(). An index of the database, which
+/// is made at the first, holds the links that have one, and nobody else pays for the others; what
+/// has not changed since the last time is not parsed again.
+class Guards {
+ public:
+  explicit Guards(std::vector<gate::GuardedPrefix> configured);
+
+  /// Brings everything up to what the database says now. To be called before each Find().
+  /// @return false when the database cannot be read; nothing is known then.
+  bool Refresh();
+
+  /// The hashes of the links that guard an address; see gate::PrefixMap::Find().
+  const std::vector<std::string> &Find(const gate::Address &address) const;
+
+  /// All that a link guards, by its own word and by the configuration's. Needs no Refresh().
+  std::vector<gate::Prefix> PrefixesOf(const VELK::sharing::record::Entry &link) const;
+
+ private:
+  /// A link that says what it guards.
+  struct Speaker {
+    std::string hash;
+    std::string data;  ///< As it is stored.
+    std::vector<gate::Prefix> prefixes;
+  };
+  using Speakers = std::map<int, Speaker>;  ///< By row id.
+
+  void TakeIn(Speakers speakers);
+  void Rebuild();
+
+  const std::vector<gate::GuardedPrefix> configured_;
+  Speakers speakers_;
+  gate::PrefixMap prefixes_;
+};
+
+}  // namespace web
+
+#endif
