@@ -262,7 +262,7 @@ class HandedOver(FrontEndTest):
 
     def test_an_authorizer_lets_nobody_in(self):
         self.serve_standard_input()
-        self.assertIn(b"Status: 501 ", self.ask(role=2, REQUEST_URI="/sharing-health"))
+        self.assertIn(b"Status: 403 ", self.ask(role=2, REQUEST_URI="/sharing-health"))
 
     def test_without_the_address_as_sent_the_decoded_one_is_encoded_again(self):
         self.serve_standard_input()

@@ -8,7 +8,12 @@ using Event = web::AccessNote::Event;
 
 const char *const kLink = "/sharing/abc";
 
-class SiteEvent : public velk_test::SiteTest {};
+class SiteEvent : public velk_test::SiteTest {
+ protected:
+  static int IdOf(const std::string &hash) {
+    return std::stoi(Value("SELECT id FROM entry WHERE hash = '" + hash + "'"));
+  }
+};
 
 TEST_F(SiteEvent, ALoginIsNotedWithItsLinkWhetherItWorkedOrNot) {
   StoreWithPassword("other");
@@ -17,11 +22,11 @@ TEST_F(SiteEvent, ALoginIsNotedWithItsLinkWhetherItWorkedOrNot) {
   browser.Submit(kLink, {{"password", "wrong"}});
   EXPECT_EQ(Event::LOGIN, browser.note().event);
   EXPECT_EQ(-9, browser.note().code);
-  EXPECT_EQ(2, browser.note().entry_id);
+  EXPECT_EQ(IdOf("abc"), browser.note().entry_id);
   browser.Submit(kLink, {{"password", "secret"}});
   EXPECT_EQ(Event::LOGIN, browser.note().event);
   EXPECT_EQ(1, browser.note().code);
-  EXPECT_EQ(2, browser.note().entry_id);
+  EXPECT_EQ(IdOf("abc"), browser.note().entry_id);
   EXPECT_FALSE(browser.note().uid);
 }
 
@@ -47,7 +52,7 @@ TEST_F(SiteEvent, AnOpenLinkIsEnteredOnce) {
   Browser browser(site());
   browser.Get(kLink);
   EXPECT_EQ(Event::ENTER, browser.note().event);
-  EXPECT_EQ(1, browser.note().entry_id);
+  EXPECT_EQ(IdOf("abc"), browser.note().entry_id);
   browser.Get(kLink);
   EXPECT_EQ(Event::NONE, browser.note().event);
 }
@@ -59,7 +64,7 @@ TEST_F(SiteEvent, ALogoutIsNotedWithItsLink) {
   browser.Submit(kLink, "/sharing/abc/logout", {});
   EXPECT_EQ(Event::LOGOUT, browser.note().event);
   EXPECT_EQ(1, browser.note().code);
-  EXPECT_EQ(1, browser.note().entry_id);
+  EXPECT_EQ(IdOf("abc"), browser.note().entry_id);
 }
 
 }  // namespace

@@ -47,7 +47,8 @@ void OpenForAll(const std::string &path) {
 }
 
 bool IsSentTo(const std::string &cookie_path, const std::string &path) {
-  return path == cookie_path || path.starts_with(cookie_path + "/");
+  const std::string below = cookie_path.ends_with('/') ? cookie_path : cookie_path + "/";
+  return path == cookie_path || path.starts_with(below);
 }
 
 }  // namespace

@@ -71,14 +71,28 @@ void SetListen(std::string_view value, Settings &settings) {
   settings.listen = value;
 }
 
-/// "127.0.0.1:9000", "[::1]:9000".
-bool IsOnLoopback(std::string_view value) {
-  return value.starts_with("127.0.0.1:") || value.starts_with("[::1]:");
+bool IsLoopback(const std::string &host) {
+  const auto address = velk::ParseAddress(host.c_str());
+  if (!address) return false;
+  if (address->family == AF_INET6) return IN6_IS_ADDR_LOOPBACK(&address->v6);
+  return ntohl(address->v4.s_addr) >> 24 == IN_LOOPBACKNET;
+}
+
+/// A socket that only this machine reaches: a path, or ADDRESS:PORT. No name is taken: who knows
+/// what it means tomorrow.
+std::string LocalSocket(std::string_view value) {
+  const size_t colon = value.rfind(':');
+  if (value.front() == '/' || colon == std::string_view::npos) return SocketPath(value);
+  std::string host(value.substr(0, colon));
+  if (host.starts_with('[') && host.ends_with(']')) host = host.substr(1, host.size() - 2);
+  if (!IsLoopback(host)) throw ConfigMistake("neither a loopback address nor a path");
+  ConfigNumber(value.substr(colon + 1), 0, 65535);
+  return std::string(value);
 }
 
 void SetFastCgi(std::string_view value, Settings &settings) {
   // Whoever speaks FastCGI says who the visitor is.
-  settings.fastcgi = IsOnLoopback(value) ? std::string(value) : SocketPath(value);
+  settings.fastcgi = LocalSocket(value);
 }
 
 void SetSocketMode(std::string_view value, Settings &settings) {
@@ -174,27 +188,8 @@ void SetProtect(std::string_view value, Settings &settings) {
   settings.guarded.push_back({std::move(*prefix), std::string(words[1])});
 }
 
-bool IsLoopback(const std::string &host) {
-  const auto address = velk::ParseAddress(host.c_str());
-  if (!address) return false;
-  if (address->family == AF_INET6) return IN6_IS_ADDR_LOOPBACK(&address->v6);
-  return ntohl(address->v4.s_addr) >> 24 == IN_LOOPBACKNET;
-}
-
-/// No name is taken either: who knows what it means tomorrow.
 void SetMetricsListen(std::string_view value, Settings &settings) {
-  if (value.front() == '/') {
-    settings.metrics_listen = SocketPath(value);
-    return;
-  }
-  const size_t colon = value.rfind(':');
-  if (colon == std::string_view::npos) throw ConfigMistake("neither ADDRESS:PORT nor a path");
-  std::string host(value.substr(0, colon));
-  if (host.starts_with('[') && host.ends_with(']')) host = host.substr(1, host.size() - 2);
-  if (!IsLoopback(host))
-    throw ConfigMistake("metrics are served on loopback addresses and paths only");
-  ConfigNumber(value.substr(colon + 1), 0, 65535);
-  settings.metrics_listen = value;
+  settings.metrics_listen = LocalSocket(value);
 }
 
 void SetAudit(std::string_view value, Settings &settings) {

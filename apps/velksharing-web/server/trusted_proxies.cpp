@@ -11,8 +11,6 @@
 namespace web {
 namespace {
 
-const std::string kUnix = "unix";
-
 /// All fields of a name as one list, in their order.
 std::string Joined(const Fields &fields, const char *name) {
   std::string list;
@@ -45,14 +43,17 @@ bool TrustedProxies::Identify(const std::string &peer, Request &request) const {
   while (!chain.empty()) {
     const size_t comma = chain.rfind(',');
     request.remote_address = Canonical(chain.substr(comma == std::string::npos ? 0 : comma + 1));
-    if (comma == std::string::npos || !Trusts(request.remote_address)) break;
+    if (comma == std::string::npos || !IsListed(request.remote_address)) break;
     chain.resize(comma);
   }
   return !request.remote_address.empty();
 }
 
 bool TrustedProxies::Trusts(const std::string &peer) const {
-  const std::string &name = peer.empty() ? kUnix : peer;
+  return IsListed(peer.empty() ? "unix" : peer);
+}
+
+bool TrustedProxies::IsListed(const std::string &name) const {
   return std::find(peers_.begin(), peers_.end(), name) != peers_.end();
 }
 

@@ -21,10 +21,12 @@ class TrustedProxies {
   /// @return false when there is no address to be had: the request cannot be served.
   bool Identify(const std::string &peer, Request &request) const;
 
-  /// Whether the word of `peer` counts; "" for a socket that has a path.
+  /// Whether the word of `peer` counts; "" for whoever uses a socket that has a path.
   bool Trusts(const std::string &peer) const;
 
  private:
+  bool IsListed(const std::string &name) const;
+
   std::vector<std::string> peers_;
 };
 
