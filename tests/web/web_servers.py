@@ -44,13 +44,16 @@ class WebServer:
         self.start(adapted(self.FILE, (SOCKET, socket), *self.CHANGES, *changes))
 
     def run(self, *words, **environment):
-        self.process = subprocess.Popen(words, cwd=self.folder, env={**os.environ, **environment})
+        self.messages = self.folder / "web server messages"
+        with open(self.messages, "wb") as messages:
+            self.process = subprocess.Popen(words, cwd=self.folder, stderr=messages,
+                                            env={**os.environ, **environment})
         self.test.addCleanup(self.process.wait)
         self.test.addCleanup(self.process.terminate)
         wait_until(self._listens)
 
     def _listens(self):
-        self.test.assertIsNone(self.process.poll(), "the web server does not run")
+        self.test.assertIsNone(self.process.poll(), self.messages.read_text())
         return accepts(self.port)
 
     def write(self, name, text):
