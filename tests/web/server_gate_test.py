@@ -110,6 +110,13 @@ class GateTests:
         answer = visitor.submit("/some/form", {"a": "b"})
         self.assertEqual((answer.status, answer.body), (200, WIKI))
 
+    def test_a_program_brings_its_session_in_a_field(self):
+        self.start_front_end()
+        session = self.visitor(self.wiki).cookies["sharing_sid"]
+        answer = self.stranger().get(PAGE, {"X-Velk-Sharing": session})
+        self.assertEqual((answer.status, answer.body), (200, WIKI))
+        self.expect_out(self.stranger(), headers={"X-Velk-Sharing": "A" * 32})
+
     def test_every_method_is_asked_about(self):
         self.start_front_end()
         for method in ("GET", "HEAD", "POST", "PUT", "DELETE", "OPTIONS", "TRACE", "PATCH", "PROPFIND"):
@@ -482,10 +489,14 @@ class Lighttpd(AnswersByPage, GateTests, FrontEndTest):
     AUTH_ADDRESS = "authorizer"
 
     def start_web_server(self):
-        self.web_server.start(adapted(
+        self.web_server.start(self.configuration())
+
+    def configuration(self, *changes):
+        gate = adapted(
             "lighttpd/velksharing-auth.conf", ("wiki.example", "127.0.0.1"), (SOCKET, self.socket),
-            ("3000", self.application.port), ('"read-timeout" => 10', '"read-timeout" => 1')) +
-            adapted("lighttpd/velksharing.conf", (SOCKET, self.socket)))
+            ("3000", self.application.port), ('"read-timeout" => 10', '"read-timeout" => 1'),
+            *changes)
+        return gate + adapted("lighttpd/velksharing.conf", (SOCKET, self.socket))
 
     def names_like(self, name):
         return [name]  # the others get through, and programs must not believe them
@@ -495,6 +506,21 @@ class Lighttpd(AnswersByPage, GateTests, FrontEndTest):
         self.start_front_end()
         self.expect_in(self.visitor(self.wiki))
         self.assertEqual(self.told(), {})
+
+    def test_a_program_by_cgi_is_told_who_the_visitor_is(self):
+        folder = self.folder / "programs"
+        folder.mkdir()
+        (folder / "page.sh").write_text("echo; env")
+        self.web_server = LighttpdServer(self, folder)
+        self.port = self.web_server.port
+        self.web_server.start(self.configuration(
+            ('"mod_proxy"', '"mod_cgi"'), ("proxy.server", 'cgi.assign = ( ".sh" => "/bin/sh" ) #')))
+        link = self.guard(f"http://127.0.0.1:{self.port}/")
+        self.start_front_end()
+        self.expect_out(self.stranger(), "/page.sh")
+        answer = self.visitor(link).get("/page.sh", {"VELK-SHARING-UID": "31337"})
+        self.assertIn(f"\nVELK_SHARING_HASH={link}\n".encode(), answer.body)
+        self.assertIn(b"\nVELK_SHARING_UID=\n", answer.body)
 
 
 class Apache(AnswersByPage, GateTests, FrontEndTest):
