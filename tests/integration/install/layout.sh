@@ -56,6 +56,7 @@ expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url
   "$prefix"/share/doc/velksharing/examples/caddy/velksharing-auth.caddyfile \
   "$prefix"/share/doc/velksharing/examples/traefik/velksharing-auth.yml \
   "$prefix"/share/doc/velksharing/examples/systemd/velksharing-web.service
+expect_file "$prefix"/share/doc/velksharing/forward-auth{,/nginx,/caddy,/lighttpd,/apache,/traefik}.md
 expect_folder "$stage/usr/velk/etc/private" 750
 expect_folder "$stage/usr/velk/etc/private/session" 750
 
