@@ -2,6 +2,7 @@
 
 #include <algorithm>
 
+#include "gate/prefix.h"
 #include "operations/accounts.h"
 #include "operations/failure.h"
 #include "operations/permissions.h"
@@ -90,6 +91,26 @@ void ApplyLimits(const LinkChange &change, Entry &link) {
     throw Failure(Failure::INVALID, "the link would end before it starts");
 }
 
+void CheckPrefix(const std::string &text) {
+  if (web::gate::Prefix::Parse(text)) return;
+  throw Failure(Failure::INVALID, "“" + text +
+                                      "” is nothing that a link can guard; it guards sites like "
+                                      "“https://wiki.example/” and paths like “/photos/”");
+}
+
+void ApplyProtects(const std::vector<std::string> &prefixes, Entry &link) {
+  Json::Value list(Json::arrayValue);
+  for (const std::string &prefix : prefixes) {
+    CheckPrefix(prefix);
+    list.append(prefix);
+  }
+  Json::Value app = link.get_app();
+  if (!app.isObject()) app = Json::Value(Json::objectValue);
+  app.removeMember("protects");
+  if (!list.empty()) app["protects"] = list;
+  link.set_app(app);
+}
+
 bool HasControlCharacter(const std::string &text) {
   return std::any_of(text.begin(), text.end(),
                      [](unsigned char byte) { return byte < 0x20 || byte == 0x7f; });
@@ -124,6 +145,7 @@ void Apply(const LinkChange &change, Entry &link) {
   if (change.owner_uid) link.set_owner_uid(*change.owner_uid);
   if (change.enabled) link.set_enabled(*change.enabled);
   if (change.app) link.set_app(*change.app);
+  if (change.protects) ApplyProtects(*change.protects, link);
   if (change.private_data) link.set_private_data(*change.private_data);
   ApplyProtection(change, link);
   ApplyLimits(change, link);

@@ -37,7 +37,10 @@ struct LinkChange {
 
   std::optional<VELK::sharing::record::Entry::RedirectType> redirect_type;
   std::optional<std::string> redirect_uri;
-  std::optional<Json::Value> app;           ///< An object.
+  std::optional<Json::Value> app;  ///< An object.
+  /// Addresses of other applications that the link guards, as `protects` of `app`; replaces the
+  /// list, and what else is in `app` stays.
+  std::optional<std::vector<std::string>> protects;
   std::optional<Json::Value> private_data;  ///< An object.
 };
 
@@ -47,8 +50,8 @@ void CheckNames(const LinkChange &change);
 
 /// Puts the change into the record; storing it is the caller's.
 /// @throws Failure INVALID when the link would make no sense: two kinds of protection, nobody
-///         permitted, an end before the start, a redirect without a target. The record is then
-///         partly changed.
+///         permitted, an end before the start, a redirect without a target, a guarded address that
+///         is none. The record is then partly changed.
 void Apply(const LinkChange &change, VELK::sharing::record::Entry &link);
 
 }  // namespace operations

@@ -53,6 +53,8 @@ void LinkOptions::AddClearingTo(CLI::App &command) {
   command.add_flag("--no-groups", no_groups_, "Permit no group any more")
       ->excludes(groups_option_)
       ->excludes(open);
+  command.add_flag("--no-protects", no_protects_, "Guard nothing any more")
+      ->excludes(protects_option_);
 }
 
 void LinkOptions::AddIdentity(CLI::App &command) {
@@ -107,6 +109,13 @@ void LinkOptions::AddRedirect(CLI::App &command) {
 void LinkOptions::AddDocuments(CLI::App &command) {
   CLI::Option *app = app_.AddTo(command, "--app", "JSON", "The application's data, a JSON object");
   path_.AddTo(command, "--path", "PATH", "Short for --app '{\"path\": PATH}'")->excludes(app);
+  protects_option_ = command
+                         .add_option("--protects", protects_,
+                                     "Guard an application at this address, such as "
+                                     "https://wiki.example/ or /photos/; may be repeated")
+                         ->type_name("PREFIX")
+                         ->allow_extra_args(false)
+                         ->excludes(app);
   private_data_.AddTo(command, "--private-data", "JSON",
                       "Data of the application that front ends do not show, a JSON object");
 }
@@ -156,6 +165,7 @@ void LinkOptions::ReadDocuments(LinkChange &change) const {
     app["path"] = *path_.value();
     change.app = app;
   }
+  if (!protects_.empty() || no_protects_) change.protects = protects_;
   if (private_data_.given())
     change.private_data = operations::ParseJsonObject("--private-data", *private_data_.value());
 }

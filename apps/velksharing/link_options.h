@@ -44,12 +44,13 @@ class LinkOptions {
 
   TextOption project_, owner_, title_, start_, expire_, uses_, redirect_, redirect_uri_;
   TextOption app_, path_, private_data_;
-  std::vector<std::string> users_, groups_;
+  std::vector<std::string> users_, groups_, protects_;
   bool ask_password_ = false;
   bool allow_unknown_ = false;
   bool open_ = false;
   bool no_users_ = false;
   bool no_groups_ = false;
+  bool no_protects_ = false;
   bool match_ip_ = false;
   bool no_match_ip_ = false;
   bool auto_remove_ = false;
@@ -59,6 +60,7 @@ class LinkOptions {
   CLI::Option *ask_password_option_ = nullptr;
   CLI::Option *users_option_ = nullptr;
   CLI::Option *groups_option_ = nullptr;
+  CLI::Option *protects_option_ = nullptr;
 };
 
 }  // namespace command_line

@@ -77,8 +77,42 @@ TEST_F(CliLink, PathIsShortForAnApp) {
   EXPECT_EQ("/srv/a b", Show(MakeLink({"--path", "/srv/a b"}))["app"]["path"].asString());
 }
 
+TEST_F(CliLink, WhatALinkGuardsStandsInItsApp) {
+  const Json::Value app = Show(MakeLink({"--path", "/srv/a", "--protects", "https://wiki.example/",
+                                         "--protects", "/photos/"}))["app"];
+  EXPECT_EQ("/srv/a", app["path"].asString());
+  ASSERT_EQ(2u, app["protects"].size());
+  EXPECT_EQ("https://wiki.example/", app["protects"][0].asString());
+  EXPECT_EQ("/photos/", app["protects"][1].asString());
+}
+
+TEST_F(CliLink, GuardingSomethingElseLeavesTheRestOfTheApp) {
+  const std::string hash =
+      MakeLink({"--app", R"({"path":"/srv/a","hide_download":true,"protects":["/old/"]})"});
+  Run({"link", "set", hash, "--protects", "/new/"});
+  Json::Value app = Show(hash)["app"];
+  ASSERT_EQ(1u, app["protects"].size());
+  EXPECT_EQ("/new/", app["protects"][0].asString());
+  EXPECT_EQ("/srv/a", app["path"].asString());
+  EXPECT_TRUE(app["hide_download"].asBool());
+  Run({"link", "set", hash, "--no-protects"});
+  app = Show(hash)["app"];
+  EXPECT_FALSE(app.isMember("protects"));
+  EXPECT_EQ("/srv/a", app["path"].asString());
+}
+
+TEST_F(CliLink, WhatNoLinkCanGuardIsRefused) {
+  for (const char *prefix : {"", "wiki.example", "ftp://wiki.example/", "photos/", "//photos/",
+                             "/photos/?x", "/a/../b", "https://ann@wiki.example/"}) {
+    const Outcome outcome = Refused({"--protects", prefix});
+    EXPECT_EQ(2, outcome.status) << prefix;
+    EXPECT_THAT(outcome.err, HasSubstr(std::string("“") + prefix + "”"));
+  }
+}
+
 TEST_F(CliLink, OptionsThatContradictEachOtherAreRefused) {
   EXPECT_EQ(2, Refused({"--path", "/a", "--app", "{}"}).status);
+  EXPECT_EQ(2, Refused({"--protects", "/a/", "--app", "{}"}).status);
   EXPECT_EQ(2, Refused({"--match-ip", "--no-match-ip"}).status);
   EXPECT_EQ(2, Refused({"--keep", "--auto-remove"}).status);
   EXPECT_EQ(2, Refused({"--password-stdin", "--user", "daemon"}).status);

@@ -23,8 +23,7 @@ class WebServerTests:
         self.socket = self.folder / "socket"
         self.server = None
         web_server = self.WEB_SERVER(self, self.folder)
-        web_server.start(adapted(web_server.FILE, (SOCKET, self.socket), *web_server.CHANGES,
-                                 *self.changes()))
+        web_server.serve_links(self.socket, *self.changes())
         self.port = web_server.port
 
     def changes(self):

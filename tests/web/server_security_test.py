@@ -1,62 +1,20 @@
 #!/usr/bin/env python3
 """What the front end does with visitors who mean harm, by itself and by FastCGI behind nginx."""
 
-import contextlib
-import html.parser
 import json
 import os
-import sqlite3
 import subprocess
 
 from hostile_spellings import ways_elsewhere, ways_out
 from server_support import *
-from web_servers import NginxServer, SOCKET, adapted
+from web_servers import NginxServer
 
 SECRET = b"outside of what is shared"
 EVIL = "evil.example"
-DATABASE = ROOT / "etc/private/session/sharing.db"
-
-
-def ask(port, target, *fields, method="GET", body=b""):
-    """A request of exactly these bytes, and what comes back."""
-    head = [method.encode() + b" " + raw(target) + b" HTTP/1.1", *map(raw, fields)]
-    if not any(field.lower().startswith(b"host:") for field in head):
-        head.append(b"Host: localhost")
-    if body:
-        head.append(b"Content-Length: %d" % len(body))
-    head.append(b"Connection: close")
-    return exchange(port, b"\r\n".join(head) + b"\r\n\r\n" + body)
-
-
-def raw(text):
-    return text.encode("latin-1")
 
 
 def head_of(received):
     return received.partition(b"\r\n\r\n")[0]
-
-
-def in_database(sql, *values):
-    with contextlib.closing(sqlite3.connect(DATABASE, timeout=10)) as database, database:
-        return database.execute(sql, values).fetchall()
-
-
-class Addresses(html.parser.HTMLParser):
-    """All addresses in a page to which a browser could go, or from which it could load."""
-
-    NAMES = ("href", "src", "action", "formaction", "content", "data", "poster", "srcset", "cite",
-             "background", "ping", "manifest", "xlink:href")
-
-    def __init__(self, page):
-        super().__init__()
-        self.found = []
-        self.feed(page.decode("utf-8", "replace"))
-
-    def handle_starttag(self, tag, attributes):
-        for name, value in attributes:
-            if name in self.NAMES:
-                # <meta http-equiv="refresh" content="0; url=…">
-                self.found.append(re.sub(r"(?i)^\s*\d+\s*;\s*url\s*=\s*", "", value or ""))
 
 
 def as_browsers_read(address):
@@ -128,7 +86,7 @@ class BehindNginx:
         self.server = self.keep(FrontEnd(["--fastcgi", str(socket), "--set", "socket_mode=666"],
                                          self.folder, env={**os.environ, **environment}))
         nginx = NginxServer(self, self.folder)
-        nginx.start(adapted(nginx.FILE, (SOCKET, socket), *nginx.CHANGES))
+        nginx.serve_links(socket)
         self.port = nginx.port
 
 

@@ -3,7 +3,9 @@
 The environment says where things are: VELK_BUILD the build folder, VELK_ROOT the root that it was
 built for. Tests that use the root lock it; see CMakeLists.txt."""
 
+import contextlib
 import glob
+import html.parser
 import http.client
 import os
 import pathlib
@@ -11,6 +13,7 @@ import re
 import shutil
 import signal
 import socket
+import sqlite3
 import subprocess
 import sys
 import tempfile
@@ -24,6 +27,7 @@ SOURCE = pathlib.Path(__file__).resolve().parents[2]
 PROGRAM = str(BUILD / "bin" / "velksharing-web")
 COMMAND_LINE = str(BUILD / "bin" / "velksharing")
 PASSWORD = "open sesame"
+DATABASE = ROOT / "etc/private/session/sharing.db"
 
 # Root's own files are shared with nobody where ids can be switched.
 OWNER = "nobody" if os.geteuid() == 0 else __import__("pwd").getpwuid(os.geteuid()).pw_name
@@ -47,6 +51,11 @@ def remove_database():
         os.remove(path)
     for path in glob.glob(str(ROOT / "etc/private/autoblock.db*")):
         os.remove(path)
+
+
+def in_database(sql, *values):
+    with contextlib.closing(sqlite3.connect(DATABASE, timeout=10)) as database, database:
+        return database.execute(sql, values).fetchall()
 
 
 def wait_until(what, seconds=10):
@@ -83,8 +92,12 @@ class FrontEndTest(unittest.TestCase):
     def share(self, path, *options, password=PASSWORD):
         """A link to this path.
         @return its hash."""
-        words = [COMMAND_LINE, "link", "create", "--project", "files", "--owner", OWNER, "--path",
-                 str(path), *options]
+        return self.make_link("--path", str(path), *options, password=password)
+
+    @staticmethod
+    def make_link(*options, password=PASSWORD):
+        """@return its hash."""
+        words = [COMMAND_LINE, "link", "create", "--project", "files", "--owner", OWNER, *options]
         if password is not None:
             words.append("--password-stdin")
         return subprocess.run(words, input=(password or "") + "\n", check=True, text=True,
@@ -202,9 +215,9 @@ class Visitor:
     def get(self, path, headers=None, **how):
         return self.request("GET", path, headers=headers, **how)
 
-    def form_token(self, link):
+    def form_token(self, link, headers=None):
         """The token of the login form."""
-        page = self.get(f"{self.base}/{link}")
+        page = self.get(f"{self.base}/{link}", headers)
         return re.search(rb'name="csrf" value="([^"]*)"', page.body).group(1).decode()
 
     def submit(self, path, fields, headers=None, **how):
@@ -212,10 +225,10 @@ class Visitor:
         headers = {"Content-Type": "application/x-www-form-urlencoded", **(headers or {})}
         return self.request("POST", path, urllib.parse.urlencode(fields), headers, **how)
 
-    def log_in(self, link, password=PASSWORD):
+    def log_in(self, link, password=PASSWORD, headers=None):
         """Fills the login form in, and sends it."""
-        fields = {"password": password, "csrf": self.form_token(link)}
-        return self.submit(f"{self.base}/{link}", fields)
+        fields = {"password": password, "csrf": self.form_token(link, headers)}
+        return self.submit(f"{self.base}/{link}", fields, headers)
 
 
 def exchange(port, raw, timeout=10):
@@ -237,3 +250,36 @@ def exchange(port, raw, timeout=10):
 def statuses(received):
     """Of all answers in these bytes."""
     return [int(status) for status in re.findall(rb"HTTP/1\.[01] (\d{3})", received)]
+
+
+def ask(port, target, *fields, method="GET", body=b""):
+    """A request of exactly these bytes, and what comes back."""
+    head = [method.encode() + b" " + raw(target) + b" HTTP/1.1", *map(raw, fields)]
+    if not any(field.lower().startswith(b"host:") for field in head):
+        head.append(b"Host: localhost")
+    if body:
+        head.append(b"Content-Length: %d" % len(body))
+    head.append(b"Connection: close")
+    return exchange(port, b"\r\n".join(head) + b"\r\n\r\n" + body)
+
+
+def raw(text):
+    return text.encode("latin-1")
+
+
+class Addresses(html.parser.HTMLParser):
+    """All addresses in a page to which a browser could go, or from which it could load."""
+
+    NAMES = ("href", "src", "action", "formaction", "content", "data", "poster", "srcset", "cite",
+             "background", "ping", "manifest", "xlink:href")
+
+    def __init__(self, page):
+        super().__init__()
+        self.found = []
+        self.feed(page.decode("utf-8", "replace"))
+
+    def handle_starttag(self, tag, attributes):
+        for name, value in attributes:
+            if name in self.NAMES:
+                # <meta http-equiv="refresh" content="0; url=…">
+                self.found.append(re.sub(r"(?i)^\s*\d+\s*;\s*url\s*=\s*", "", value or ""))

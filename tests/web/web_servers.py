@@ -39,14 +39,21 @@ class WebServer:
         self.folder = folder
         self.port = free_port()
 
+    def serve_links(self, socket, *changes):
+        """The pages of links, by FastCGI on this socket, with the configuration of packaging/."""
+        self.start(adapted(self.FILE, (SOCKET, socket), *self.CHANGES, *changes))
+
     def run(self, *words, **environment):
-        self.process = subprocess.Popen(words, cwd=self.folder, env={**os.environ, **environment})
+        self.messages = self.folder / "web server messages"
+        with open(self.messages, "wb") as messages:
+            self.process = subprocess.Popen(words, cwd=self.folder, stderr=messages,
+                                            env={**os.environ, **environment})
         self.test.addCleanup(self.process.wait)
         self.test.addCleanup(self.process.terminate)
         wait_until(self._listens)
 
     def _listens(self):
-        self.test.assertIsNone(self.process.poll(), "the web server does not run")
+        self.test.assertIsNone(self.process.poll(), self.messages.read_text())
         return accepts(self.port)
 
     def write(self, name, text):
@@ -57,9 +64,17 @@ class WebServer:
 
 class NginxServer(WebServer):
     FILE = "nginx/velksharing.conf"
-    CHANGES = [("include fastcgi", "include /etc/nginx/fastcgi")]
+    UPSTREAM_FILE = "nginx/velksharing-upstream.conf"
+    CHANGES = []
 
-    def start(self, configuration):
+    def serve_links(self, socket, *changes):
+        self.start(adapted(self.FILE, *self.CHANGES, *changes), self.upstream(socket))
+
+    def upstream(self, socket):
+        return adapted(self.UPSTREAM_FILE, (SOCKET, socket))
+
+    def start(self, configuration, outside=""):
+        """@param configuration of a server. @param outside what stands beside it."""
         snippet = self.write("velksharing.conf", configuration)
         empty = self.folder / "empty"
         empty.mkdir()
@@ -70,6 +85,7 @@ daemon off; worker_processes 1; pid {self.folder}/nginx.pid; error_log {self.fol
 events {{ }}
 http {{
   access_log off; {temporary}
+  {outside}
   server {{ listen 127.0.0.1:{self.port}; root {empty}; include {snippet}; }}
 }}""")
         self.run("/usr/sbin/nginx", "-e", f"{self.folder}/nginx.log", "-c", config)
@@ -99,9 +115,9 @@ class ApacheServer(WebServer):
     CGI_FILE = "apache/velksharing-cgi.conf"
     CHANGES = []
 
-    def start(self, configuration):
+    def start(self, configuration, modules=("proxy", "proxy_fcgi")):
         user = "User www-data\nGroup www-data\n" if os.geteuid() == 0 else ""
-        self.run(*self._words(("proxy", "proxy_fcgi"), user + configuration))
+        self.run(*self._words(modules, user + configuration))
 
     def start_cgi(self):
         """Programs run as the account that serves, which Apache refuses to be root."""
@@ -123,3 +139,17 @@ Mutex posixsem
 DocumentRoot {self.folder}
 {loaded}{configuration}""")
         return "/usr/sbin/apache2", "-D", "FOREGROUND", "-f", config
+
+
+class CaddyServer(WebServer):
+    def start(self, configuration):
+        config = self.write("Caddyfile", f"""
+{{
+	admin off
+	auto_https off
+	grace_period 1s
+}}
+{configuration}""")
+        self.run("/usr/bin/caddy", "run", "--config", config, "--adapter", "caddyfile",
+                 HOME=str(self.folder), XDG_DATA_HOME=str(self.folder),
+                 XDG_CONFIG_HOME=str(self.folder))

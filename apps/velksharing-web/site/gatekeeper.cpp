@@ -50,7 +50,8 @@ Response Opened(const Admitted &admitted, bool is_authorizer) {
   Response response;
   response.status = is_authorizer ? 200 : 204;
   response.headers.Add("X-Velk-Sharing-Hash", admitted.hash);
-  response.headers.Add("X-Velk-Sharing-Remaining", std::to_string(admitted.grant.remaining));
+  const std::string remaining = std::to_string(admitted.grant.remaining);
+  response.headers.Add("X-Velk-Sharing-Remaining", remaining);
   const bool has_account = admitted.grant.uid != VELK::sharing::UID_ERR;
   const std::string uid = has_account ? std::to_string(admitted.grant.uid) : "";
   if (has_account) response.headers.Add("X-Velk-Sharing-Uid", uid);
@@ -58,6 +59,7 @@ Response Opened(const Admitted &admitted, bool is_authorizer) {
   // What an authorizer gives to the application behind it.
   response.headers.Add("Variable-VELK_SHARING_HASH", admitted.hash);
   response.headers.Add("Variable-VELK_SHARING_UID", uid);
+  response.headers.Add("Variable-VELK_SHARING_REMAINING", remaining);
   return response;
 }
 

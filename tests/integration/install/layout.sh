@@ -50,9 +50,13 @@ expect_file "$stage"/usr/velk/bin/{velksharingurl,velkwebapi} \
   "$prefix"/share/man/man8/{velksharingurl,velkwebapi}.8 "$prefix/share/doc/velksharing/webapi.md"
 expect_file "$prefix"/share/doc/velksharing/examples/{autoblock.conf,sharing-url.conf,pam/velk} \
   "$prefix"/share/doc/velksharing/examples/{sharing-web.conf,nginx/velksharing.conf} \
-  "$prefix"/share/doc/velksharing/examples/lighttpd/velksharing{,-cgi}.conf \
-  "$prefix"/share/doc/velksharing/examples/apache/velksharing{,-cgi}.conf \
+  "$prefix"/share/doc/velksharing/examples/nginx/velksharing-{upstream,auth,auth-http,auth-app}.conf \
+  "$prefix"/share/doc/velksharing/examples/lighttpd/velksharing{,-cgi,-auth}.conf \
+  "$prefix"/share/doc/velksharing/examples/apache/velksharing{,-cgi,-auth}.conf \
+  "$prefix"/share/doc/velksharing/examples/caddy/velksharing-auth.caddyfile \
+  "$prefix"/share/doc/velksharing/examples/traefik/velksharing-auth.yml \
   "$prefix"/share/doc/velksharing/examples/systemd/velksharing-web.service
+expect_file "$prefix"/share/doc/velksharing/forward-auth{,/nginx,/caddy,/lighttpd,/apache,/traefik}.md
 expect_folder "$stage/usr/velk/etc/private" 750
 expect_folder "$stage/usr/velk/etc/private/session" 750
 
