@@ -24,6 +24,7 @@ class Shared:
         self._programs = build / 'bin'
         self._folder = folder
         self._database = None
+        self._secret = folder / 'password'
         self.links = links
         self.credentials = Credentials('visitor', secrets.token_urlsafe(12))
         self.files = folder / 'shared'
@@ -57,11 +58,8 @@ class Shared:
             self._make_guard(f'https://site{number}.example/', f'/other/{number}/')
 
     def _write_password(self):
-        with open(os.open(self._password_file(), os.O_WRONLY | os.O_CREAT, 0o600), 'w') as file:
+        with open(os.open(self._secret, os.O_WRONLY | os.O_CREAT, 0o600), 'w') as file:
             file.write(self.credentials.password + '\n')
-
-    def _password_file(self):
-        return self._folder / 'password'
 
     def _make_guard(self, *prefixes):
         self._make_link('--app', json.dumps({'protects': prefixes}))
@@ -71,7 +69,7 @@ class Shared:
         return program.run([
             self._programs / 'velksharing', 'link', 'create', '--project', 'files',
             '--owner', program.plain_user(), '--title', 'Pages',
-            '--password-file', self._password_file(), *content])
+            '--password-file', self._secret, *content])
 
 
 def _text():
