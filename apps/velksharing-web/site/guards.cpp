@@ -2,7 +2,6 @@
 
 #include <syslog.h>
 #include <velksharing/database.h>
-#include <velksharing/store.h>
 
 #include <optional>
 #include <string_view>
@@ -11,7 +10,6 @@
 namespace web {
 namespace {
 
-using VELK::sharing::db::EntryDB;
 using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 using VELK::sharing::db::SharingDB;
@@ -23,7 +21,7 @@ constexpr char kIndex[] =
     "CREATE INDEX IF NOT EXISTS entry_guards ON entry (id)"
     " WHERE instr(data, x'2270726F746563747322') > 0";
 constexpr char kSpeakers[] =
-    "SELECT id, hash, data FROM entry INDEXED BY entry_guards"
+    "SELECT * FROM entry INDEXED BY entry_guards"
     " WHERE instr(data, x'2270726F746563747322') > 0";
 
 /// Every text of `app.protects` that is a prefix.
@@ -43,9 +41,12 @@ std::vector<gate::Prefix> OwnPrefixes(const Entry &link, std::optional<std::stri
   return prefixes;
 }
 
-std::vector<gate::Prefix> PrefixesOfNewcomer(int id, const std::string &hash) {
+std::vector<gate::Prefix> PrefixesIn(const Row &row, int id) {
   Entry link;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link)) return {};
+  if (!link.FromRow(row)) {
+    syslog(LOG_WARNING, "link %d: cannot be read, and guards nothing", id);
+    return {};
+  }
   std::optional<std::string> refused;
   std::vector<gate::Prefix> prefixes = OwnPrefixes(link, refused);
   if (refused)
@@ -68,35 +69,28 @@ Guards::Guards(std::vector<gate::GuardedPrefix> configured) : configured_(std::m
 }
 
 bool Guards::Refresh() {
+  // Taken out: should one of them fail to be read in the middle, all are read anew the next time.
+  Speakers known = std::exchange(speakers_, {});
   Result result;
-  if (!ReadSpeakers(result)) {
-    TakeIn({});
-    return false;
-  }
+  const bool is_read = ReadSpeakers(result);
   Speakers speakers;
-  Row row;
-  while (result.NextRow(row)) {
+  bool is_changed = false;
+  for (Row row; is_read && result.NextRow(row);) {
     const int id = row.GetField("id").AsInt(0);
-    speakers[id] = {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), {}};
-  }
-  TakeIn(std::move(speakers));
-  return true;
-}
-
-void Guards::TakeIn(Speakers speakers) {
-  bool is_changed = speakers.size() != speakers_.size();
-  for (auto &[id, speaker] : speakers) {
-    const auto known = speakers_.find(id);
-    if (known != speakers_.end() && known->second.hash == speaker.hash &&
-        known->second.data == speaker.data) {
-      speaker.prefixes = std::move(known->second.prefixes);
+    Speaker speaker = {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), {}};
+    const auto before = known.find(id);
+    if (before != known.end() && before->second.SaysTheSameAs(speaker)) {
+      speaker.prefixes = std::move(before->second.prefixes);
     } else {
-      speaker.prefixes = PrefixesOfNewcomer(id, speaker.hash);
+      speaker.prefixes = PrefixesIn(row, id);
       is_changed = true;
     }
+    speakers[id] = std::move(speaker);
   }
+  is_changed = is_changed || speakers.size() != known.size();
   speakers_ = std::move(speakers);
   if (is_changed) Rebuild();
+  return is_read;
 }
 
 void Guards::Rebuild() {

@@ -40,10 +40,13 @@ class Guards {
     std::string hash;
     std::string data;  ///< As it is stored.
     std::vector<gate::Prefix> prefixes;
+
+    bool SaysTheSameAs(const Speaker &other) const {
+      return hash == other.hash && data == other.data;
+    }
   };
   using Speakers = std::map<int, Speaker>;  ///< By row id.
 
-  void TakeIn(Speakers speakers);
   void Rebuild();
 
   const std::vector<gate::GuardedPrefix> configured_;
