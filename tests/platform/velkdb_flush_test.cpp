@@ -131,6 +131,39 @@ TEST_F(VelkDbFlush, ATransactionOfSessionsAndGrantsIsNotFlushed) {
   EXPECT_EQ(FlushesOf("COMMIT"), 0);
 }
 
+TEST_F(VelkDbFlush, ATransactionThatHoldsTheWriteLockIsJudgedByItsRows) {
+  for (const char *begin : {"BEGIN IMMEDIATE", "BEGIN EXCLUSIVE"}) {
+    EXPECT_EQ(FlushesOf(begin), 0);
+    EXPECT_EQ(FlushesOf("UPDATE session SET timeout='4102444801' WHERE id=1"), 0);
+    EXPECT_EQ(FlushesOf("UPDATE token SET timeout='4102444801' WHERE id=1"), 0);
+    EXPECT_EQ(FlushesOf("COMMIT"), 0) << begin;
+  }
+}
+
+TEST_F(VelkDbFlush, ATransactionThatHoldsTheWriteLockIsFlushedWithADeletion) {
+  EXPECT_EQ(FlushesOf("BEGIN IMMEDIATE"), 0);
+  EXPECT_EQ(FlushesOf(kNewSession), 0);
+  EXPECT_EQ(FlushesOf("DELETE FROM token WHERE id=1"), 0);
+  EXPECT_EQ(FlushesOf("COMMIT"), 1);
+}
+
+TEST_F(VelkDbFlush, ATransactionThatHoldsTheWriteLockIsFlushedWithALink) {
+  EXPECT_EQ(FlushesOf("BEGIN IMMEDIATE"), 0);
+  EXPECT_EQ(FlushesOf("UPDATE entry SET use_count='5' WHERE id=1"), 0);
+  EXPECT_EQ(FlushesOf("UPDATE session SET timeout='4102444801' WHERE id=1"), 0);
+  EXPECT_EQ(FlushesOf("COMMIT"), 1);
+}
+
+TEST_F(VelkDbFlush, ATransactionWithNothingInItIsNotFlushed) {
+  EXPECT_EQ(FlushesOf("BEGIN IMMEDIATE; COMMIT"), 0);
+  EXPECT_EQ(FlushesOf("BEGIN IMMEDIATE; SELECT * FROM entry; ROLLBACK"), 0);
+}
+
+TEST_F(VelkDbFlush, WhatOneTransactionWroteDoesNotCountForTheNext) {
+  EXPECT_EQ(FlushesOf("BEGIN IMMEDIATE; DELETE FROM token WHERE id=1; COMMIT"), 1);
+  EXPECT_EQ(FlushesOf(std::string("BEGIN IMMEDIATE;") + kNewToken + "; COMMIT"), 0);
+}
+
 TEST_F(VelkDbFlush, ATransactionRolledBackIsNotFlushedAndForgotten) {
   EXPECT_EQ(FlushesOf(std::string("BEGIN; ") + kNewEntry), 0);
   EXPECT_EQ(FlushesOf("ROLLBACK"), 0);
@@ -269,6 +302,30 @@ TEST_F(VelkDbFlush, TheLogIsTakenIntoTheFileAtAThousandFrames) {
   const size_t frame = 4096 + 24;
   EXPECT_LT(std::filesystem::file_size(path_ + "-wal"), 1100 * frame);
   EXPECT_GT(std::filesystem::file_size(path_), 100 * 1024U);
+}
+
+// The reader is always one commit behind, so that each attempt would find something to take in.
+TEST_F(VelkDbFlush, ALogThatAReaderHoldsIsNotTakenInAtEachCommit) {
+  VelkDbConnection reader(path_);
+  log_flushes = 0;
+  for (int i = 0; i < 2500; ++i) {
+    ASSERT_EQ(reader.Run("BEGIN; SELECT * FROM entry"), 0);
+    Run("UPDATE token SET timeout='" + std::to_string(i) + "'");
+    ASSERT_EQ(reader.Run("COMMIT"), 0);
+  }
+  EXPECT_GE(log_flushes, 1);
+  EXPECT_LE(log_flushes, 10);
+}
+
+TEST_F(VelkDbFlush, ALogThatAReaderHeldIsTakenInLater) {
+  VelkDbConnection reader(path_);
+  ASSERT_EQ(reader.Run("BEGIN; SELECT * FROM entry"), 0);
+  for (int i = 0; i < 1500; ++i) Run("UPDATE token SET timeout='" + std::to_string(i) + "'");
+  ASSERT_EQ(reader.Run("COMMIT"), 0);
+  for (int i = 0; i < 1500; ++i) Run("UPDATE token SET timeout='" + std::to_string(i) + "'");
+  const auto size = std::filesystem::file_size(path_ + "-wal");
+  for (int i = 0; i < 3000; ++i) Run("UPDATE token SET timeout='" + std::to_string(i) + "'");
+  EXPECT_EQ(std::filesystem::file_size(path_ + "-wal"), size);
 }
 
 TEST_F(VelkDbFlush, WithoutALogSqliteFlushesByItself) {

@@ -36,7 +36,7 @@ TEST(GateAddress, AnOrdinaryAddressIsReadInOneWay) {
 TEST(GateAddress, TheSpellingsOfAnOriginAreOne) {
   for (const char *text :
        {"https://wiki.example/", "HTTPS://WIKI.Example", "https://wiki.example.",
-        "https://wiki.example:443/", "https://wiki.example:0443", "https://wiki.example:?x"})
+        "https://wiki.example:443/", "https://wiki.example:0443", "https://wiki.example:/?x"})
     EXPECT_EQ("https://wiki.example", OriginOf(text)) << text;
 }
 
@@ -53,8 +53,13 @@ TEST(GateAddress, ShortensIPv6) {
 
 TEST(GateAddress, AnEmptyPathIsTheRoot) {
   EXPECT_EQ("/", Address::Parse("https://h")->target());
-  EXPECT_EQ("/?x", Address::Parse("https://h?x")->target());
-  EXPECT_EQ("", Address::Parse("https://h?x")->readings().front().text());
+  EXPECT_EQ("", Address::Parse("https://h")->readings().front().text());
+}
+
+TEST(GateAddress, AHostThatEndsInAQuestionMarkMakesNoQueryOfThePath) {
+  EXPECT_FALSE(Address::Parse("https://wiki.example?/private"));
+  EXPECT_FALSE(Address::Parse("https://wiki.example:443?/private"));
+  EXPECT_FALSE(Address::Parse("https://wiki.example?"));
 }
 
 TEST(GateAddress, ASlashAtTheEndMakesNoDifference) {
@@ -63,7 +68,7 @@ TEST(GateAddress, ASlashAtTheEndMakesNoDifference) {
 }
 
 TEST(GateAddress, ItsTextIsAnAddressOfItsOwn) {
-  const auto address = Address::Parse("HTTPS://[0::1]:443?a//%61;b");
+  const auto address = Address::Parse("HTTPS://[0::1]:443/?a//%61;b");
   ASSERT_TRUE(address);
   const auto again = Address::Parse(address->text());
   ASSERT_TRUE(again);

@@ -1,11 +1,15 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include "http/cookies.h"
 
 namespace {
 
+using testing::ElementsAre;
+using testing::IsEmpty;
 using web::Cookie;
 using web::FindCookie;
+using web::FindCookies;
 using web::Request;
 using web::SetCookieText;
 
@@ -41,6 +45,13 @@ TEST(Cookies, TheFirstOfEqualNamesCounts) {
 TEST(Cookies, FindsNothingInWhatIsNoCookie) {
   for (const char *field : {"", ";;;", "a", "=1", "b=a=1", "A=1", "a b=1"})
     EXPECT_EQ("", FindCookie(RequestWith({field}), "a")) << field;
+}
+
+TEST(Cookies, FindsAllOfAName) {
+  EXPECT_THAT(FindCookies(RequestWith({"a=1; b=2; a=\"3\"", "c=4", "a=5;a="}), "a"),
+              ElementsAre("1", "3", "5", ""));
+  EXPECT_THAT(FindCookies(RequestWith({"b=a=1; A=1; aa=1", "a", ""}), "a"), ElementsAre(""));
+  EXPECT_THAT(FindCookies(Request(), "a"), IsEmpty());
 }
 
 TEST(Cookies, WritesACookie) {

@@ -45,4 +45,12 @@ TEST(Host, ThePortStandsBehindTheColonThatIsNotOfIPv6) {
   EXPECT_EQ("1:2", SplitHostAndPort("h:1:2").port);
 }
 
+TEST(HttpHost, OneThatReachesIntoThePathIsFound) {
+  for (const char *authority : {"wiki.example", "wiki.example:443", "[::1]:80", ""})
+    EXPECT_TRUE(web::IsApartFromPath(authority)) << authority;
+  for (const char *authority :
+       {"wiki.example/", "wiki.example/a", "wiki.example?", "wiki.example#a", "a\\b", "/", "?"})
+    EXPECT_FALSE(web::IsApartFromPath(authority)) << authority;
+}
+
 }  // namespace

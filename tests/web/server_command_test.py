@@ -48,6 +48,12 @@ class Configuration(FrontEndTest):
                      "path = sharing", "path = /a b", "path = /a/../b", "path = //a",
                      "access_log = here", "runtime_folder = run", "retry_after = -1",
                      "trusted_proxy = somebody", "file_delivery = pigeon",
+                     "auth_address = x-original-uri", "auth_address = on", "auth_address =",
+                     "protect = /photos", "protect = /photos abc def", "protect = photos abc",
+                     "protect = /a/../b abc", "protect = /a?b abc", "protect = /a a-b",
+                     "protect = ftp://h/ abc", "fastcgi = 0.0.0.0:9000", "fastcgi = [::]:9000",
+                     "fastcgi = 192.0.2.1:9000", "fastcgi = localhost:9000",
+                     "fastcgi = 127.0.0.1:", "fastcgi = 127.0.0.1:65536", "fastcgi = 127.0.0.1:x",
                      "audit = maybe", "audit_retention = 0", "audit_retention = 3651",
                      "audit_address = some", "metrics_listen = 0.0.0.0:9180",
                      "socket_group = no such group", "fastcgi = socket",
@@ -60,6 +66,33 @@ class Configuration(FrontEndTest):
     def test_what_excludes_each_other_is_refused(self):
         self.assertEqual(self.check("listen = 127.0.0.1:80\nfastcgi = /run/x\n").returncode, 2)
         self.assertEqual(self.check("file_delivery = x-sendfile\n").returncode, 2)
+
+    def test_how_web_servers_ask_is_one_of_the_known_ways(self):
+        for way in ("off", "parameter", "authorizer"):
+            self.assertEqual(self.check(f"auth_address = {way}\n").returncode, 0, way)
+        for way in ("x-forwarded", "x-original-url"):
+            outcome = self.check(f"auth_address = {way}\n")
+            self.assertEqual(outcome.returncode, 2, way)
+            self.assertIn("trusted_proxy", outcome.stderr)
+            outcome = self.check(f"auth_address = {way}\ntrusted_proxy = 127.0.0.1\n")
+            self.assertEqual(outcome.returncode, 0, outcome.stderr)
+
+    def test_a_key_that_stands_twice_is_refused_unless_it_is_a_list(self):
+        protect = "protect = /photos abc\nprotect = https://wiki.example/ def\n"
+        self.assertEqual(self.check("auth_address = parameter\n" + protect).returncode, 0)
+        outcome = self.check("auth_address = parameter\nauth_address = off\n")
+        self.assertEqual(outcome.returncode, 2)
+        self.assertIn("sharing-web.conf:2: key given twice", outcome.stderr)
+
+    def test_what_links_guard_is_refused_where_nobody_may_ask(self):
+        outcome = self.check("protect = /photos abc\n")
+        self.assertEqual(outcome.returncode, 2)
+        self.assertIn("auth_address", outcome.stderr)
+
+    def test_fastcgi_takes_a_path_and_this_machines_addresses(self):
+        for place in ("/run/velk/web.sock", "127.0.0.1:9000", "127.1.2.3:0", "[::1]:9000"):
+            outcome = self.check(f"fastcgi = {place}\n")
+            self.assertEqual(outcome.returncode, 0, outcome.stderr)
 
     def test_options_are_in_place_of_the_configuration(self):
         self.assertEqual(self.check("fastcgi = /run/x\n", "--listen", "[::1]:0").returncode, 0)
@@ -167,14 +200,14 @@ def parameter(name, value):
     return struct.pack(">II", len(name) | 1 << 31, len(value) | 1 << 31) + name + value
 
 
-def fastcgi(connection, role=1, keep=False, **variables):
+def fastcgi(connection, role=1, keep=False, body=b"", **variables):
     """One request by FastCGI.
     @return what is answered, head and all."""
     variables = {"REQUEST_METHOD": "GET", "REMOTE_ADDR": "192.0.2.7", **variables}
     parameters = b"".join(parameter(name.encode(), value.encode())
                           for name, value in variables.items())
     connection.sendall(record(1, struct.pack(">HB5x", role, keep)) + record(4, parameters) +
-                       record(4, b"") + record(5, b""))
+                       record(4, b"") + (record(5, body) if body else b"") + record(5, b""))
     answer = b""
     while True:
         _, kind, _, length, padding = struct.unpack(">BBHHBx", read(connection, 8))
@@ -247,6 +280,19 @@ class HandedOver(FrontEndTest):
                 answer = self.ask(kept, keep=True, REQUEST_URI="/sharing-health")
                 self.assertIn(b" 200 ", answer)
 
+    def test_a_body_that_comes_with_a_question_is_not_taken_for_the_next_request(self):
+        self.serve_standard_input()
+        inner = (record(1, struct.pack(">HB5x", 1, 1)) +
+                 record(4, parameter(b"REQUEST_URI", b"/sharing-health")) + record(4, b"") +
+                 record(5, b""))
+        with socket.create_connection(self.listening.getsockname(), timeout=10) as kept:
+            answer = self.ask(kept, keep=True, body=inner * 100, VELK_SHARING_AUTH="x",
+                              REQUEST_URI="/sharing-health")
+            self.assertIn(b"Status: 403 ", answer)
+            answer = self.ask(kept, keep=True, VELK_SHARING_AUTH="x", REQUEST_URI="/sharing-health")
+            self.assertNotIn(b"Status: 2", answer)
+        self.assertIn(b" 200 ", self.ask(REQUEST_URI="/sharing-health"))
+
     def test_a_connection_that_is_kept_for_nothing_keeps_nobody_out(self):
         self.serve_standard_input("--workers", "1", "--set", "threads=1")
         with socket.create_connection(self.listening.getsockname(), timeout=10) as kept:
@@ -280,6 +326,21 @@ class HandedOver(FrontEndTest):
                 except ConnectionError:
                     pass
         self.assertIn(b" 200 ", self.ask(REQUEST_URI="/sharing-health"))
+
+
+class PlainCgi(FrontEndTest):
+    def answer(self, **variables):
+        environment = {**os.environ, "GATEWAY_INTERFACE": "CGI/1.1", "REQUEST_METHOD": "GET",
+                       "REMOTE_ADDR": "192.0.2.7", **variables}
+        return run(env=environment, stdin=subprocess.DEVNULL).stdout
+
+    def test_a_request_is_answered(self):
+        self.assertTrue(self.answer(REQUEST_URI="/sharing-health").startswith("Status: 200 "))
+
+    def test_a_question_is_never_taken_for_a_request(self):
+        for address in ("", "https://wiki.example/"):
+            answer = self.answer(REQUEST_URI="/sharing-health", VELK_SHARING_AUTH=address)
+            self.assertTrue(answer.startswith("Status: 403 "), answer)
 
 
 if __name__ == "__main__":

@@ -387,5 +387,75 @@ class Visits(FrontEndTest):
         self.assertNotIn("Secure", page.headers["Set-Cookie"])
 
 
+class Questions(FrontEndTest):
+    """A web server asks, for a visitor who is in, and in every way that it should not."""
+
+    ADDRESS = "X-Original-URL: https://wiki.example/page"
+
+    def setUp(self):
+        super().setUp()
+        link = self.share(self.make_file("a.bin", 10).parent)
+        self.server = self.start("--set", "auth_address=x-original-url",
+                                 "--set", "trusted_proxy=127.0.0.1", "--set", f"protect=/ {link}")
+        visitor = Visitor(self.server.port)
+        visitor.log_in(link)
+        self.cookie = f"Cookie: sharing_sid_{link}=" + visitor.cookies[f"sharing_sid_{link}"]
+
+    def ask(self, *fields, line="GET /sharing-auth HTTP/1.1", body=""):
+        """The statuses of all that is answered."""
+        head = "\r\n".join([line, "Host: wiki.example", "Connection: close", *fields])
+        return statuses(exchange(self.server.port, f"{head}\r\n\r\n{body}".encode()))
+
+    def test_the_endpoint_answers_whatever_the_method_and_version(self):
+        for line in ("GET /sharing-auth HTTP/1.1", "HEAD /sharing-auth HTTP/1.1",
+                     "POST /sharing-auth HTTP/1.1", "OPTIONS /sharing-auth HTTP/1.1",
+                     "GET /sharing-auth HTTP/1.0", "GET /sharing-auth?x HTTP/1.1",
+                     "GET http://elsewhere.example/sharing-auth HTTP/1.1"):
+            with self.subTest(line):
+                self.assertEqual(self.ask(self.ADDRESS, self.cookie, line=line), [204])
+                self.assertEqual(self.ask(self.ADDRESS, line=line), [401])
+                self.assertEqual(self.ask(self.cookie, line=line), [403])
+
+    def test_nothing_that_looks_like_the_endpoint_says_yes(self):
+        for target in ("/sharing-auth/", "/sharing-auth//", "/sharing-auth/x", "/sharing-auth/.",
+                       "/sharing-auth;x", "/sharing-auth%00", "/sharing-auth%20", "/sharing-auth%2f",
+                       "/sharing%2dauth", "/sharing%2Dauth", "/%73haring-auth", "//sharing-auth",
+                       "/./sharing-auth", "/x/../sharing-auth", "/sharing/../sharing-auth",
+                       "/SHARING-AUTH", "/sharing-auth#x", "sharing-auth", "*", "/sharing/-auth",
+                       "http://elsewhere.example", "https://wiki.example/page", "/page"):
+            with self.subTest(target):
+                answered = self.ask(self.ADDRESS, self.cookie, line=f"GET {target} HTTP/1.1")
+                self.assertTrue(answered and min(answered) >= 400, answered)
+
+    def test_an_address_that_comes_in_two_ways_or_in_another_one_is_none(self):
+        for fields in ([self.ADDRESS, self.ADDRESS],
+                       [self.ADDRESS, "x-original-url: https://wiki.example/other"],
+                       [self.ADDRESS + ", https://wiki.example/"], ["X-Original-URL:"],
+                       ["X-Original-URI: /page"], ["X_Original_URL: https://wiki.example/page"],
+                       ["X-Forwarded-Proto: https", "X-Forwarded-Host: wiki.example",
+                        "X-Forwarded-Uri: /page"],
+                       ["X-Original-URL: /page"], ["X-Original-URL: https://wiki.example?/page"]):
+            with self.subTest(fields):
+                answered = self.ask(*fields, self.cookie)
+                self.assertTrue(answered and min(answered) >= 400, answered)
+
+    def test_a_body_that_comes_along_changes_nothing(self):
+        for size, statuses_wanted in ((10, [204]), (100_000, [413])):
+            answered = self.ask(self.ADDRESS, self.cookie, f"Content-Length: {size}",
+                                line="POST /sharing-auth HTTP/1.1", body="x" * size)
+            self.assertEqual(answered, statuses_wanted)
+        inner = "GET /sharing-health HTTP/1.1\r\nHost: h\r\n\r\n"
+        answered = self.ask(self.ADDRESS, f"Content-Length: {len(inner)}", body=inner)
+        self.assertEqual(answered, [401])
+
+    def test_cookies_that_are_no_sessions_of_the_visitors_say_no(self):
+        name = self.cookie.partition("=")[0]
+        for cookie in (name + "=", name + "=x", name + "=%", name + "=" + "A" * 200,
+                       "Cookie: sharing_sid" + "=" + self.cookie.partition("=")[2],
+                       self.cookie.lower(), self.cookie + "x"):
+            with self.subTest(cookie):
+                self.assertEqual(self.ask(self.ADDRESS, cookie), [401])
+
+
 if __name__ == "__main__":
     main()

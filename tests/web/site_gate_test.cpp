@@ -172,7 +172,8 @@ TEST_F(SiteGate, WhatIsNotClearlyAnAddressIsClosed) {
   for (const char *address :
        {"", "/", "/page", "//wiki.example/", "wiki.example/", "ftp://wiki.example/",
         "https://wiki.example/%zz", "https://wiki.example/%00", "https://user@wiki.example/",
-        "https://wiki.example/#a", "https:///", "https://wiki.example/a b"})
+        "https://wiki.example/#a", "https:///", "https://wiki.example/a b",
+        "https://wiki.example?/"})
     EXPECT_EQ(403, browser.Ask(address).status) << address;
 }
 

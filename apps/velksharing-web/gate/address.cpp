@@ -24,8 +24,10 @@ std::optional<Address> Address::Parse(std::string_view text) {
     return std::nullopt;
   std::optional<std::string> origin = TakeOrigin(text);
   if (!origin) return std::nullopt;
+  if (text.empty()) text = "/";
+  // Not a query: a visitor who names the host "wiki.example?" would turn the path into one.
+  if (!text.starts_with('/')) return std::nullopt;
   std::string target(text);
-  if (!target.starts_with('/')) target.insert(0, "/");
   std::optional<std::vector<Reading>> readings =
       ReadingsOf(std::string_view(target).substr(0, target.find('?')));
   if (!readings) return std::nullopt;

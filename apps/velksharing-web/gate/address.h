@@ -25,9 +25,10 @@ class Address {
   static constexpr size_t kLongest = 16 * 1024;  ///< Bytes.
 
   /// @return nothing for whatever is no address of http or https, or not clearly one: an account
-  ///         before the host, a host or port that is none, a fragment, a blank or control character
-  ///         anywhere, a path that ReadingsOf() refuses, more than `kLongest` bytes. Bytes beyond
-  ///         ASCII may stand in path and query. The query is not looked at any closer.
+  ///         before the host, a host or port that is none, a query without a path, a fragment, a
+  ///         blank or control character anywhere, a path that ReadingsOf() refuses, more than
+  ///         `kLongest` bytes. Bytes beyond ASCII may stand in path and query. The query is not
+  ///         looked at any closer.
   static std::optional<Address> Parse(std::string_view text);
 
   /// Scheme, host and port in their one form: "https://wiki.example", "http://[::1]:8080".

@@ -68,4 +68,8 @@ HostAndPort SplitHostAndPort(std::string_view authority) {
   return {authority.substr(0, colon), authority.substr(colon + 1)};
 }
 
+bool IsApartFromPath(std::string_view authority) {
+  return authority.find_first_of("/\\?#") == std::string_view::npos;
+}
+
 }  // namespace web

@@ -24,6 +24,10 @@ struct HostAndPort {
 /// Splits "host:port" at its colon, which is none of those in an IPv6 address.
 HostAndPort SplitHostAndPort(std::string_view authority);
 
+/// Whether host and port, as somebody sent them, reach into nothing that stands behind them in an
+/// address: a host "wiki.example/a" or "wiki.example?" would change the path.
+bool IsApartFromPath(std::string_view authority);
+
 }  // namespace web
 
 #endif

@@ -3,6 +3,7 @@
 #include <optional>
 #include <string_view>
 
+#include "http/host.h"
 #include "server/cgi_request.h"
 
 namespace web {
@@ -34,7 +35,8 @@ std::string PageScheme(const std::string &scheme) {
 
 std::string Joined(const std::optional<std::string> &scheme, const std::optional<std::string> &host,
                    const std::optional<std::string> &target) {
-  if (!scheme || !host || !target || !target->starts_with('/')) return "";
+  if (!scheme || !host || !target) return "";
+  if (!IsApartFromPath(*host) || !target->starts_with('/')) return "";
   return PageScheme(*scheme) + "://" + *host + *target;
 }
 
@@ -47,7 +49,8 @@ std::string ForwardedAddress(const Fields &fields) {
 std::string ServedAddress(const char *const *environment) {
   std::optional<std::string> host = OnlyValue(environment, "SERVER_NAME");
   const auto port = OnlyValue(environment, "SERVER_PORT");
-  if (host && port) *host += ":" + *port;
+  if (!host || !port) return "";
+  *host += ":" + *port;
   return Joined(OnlyValue(environment, "REQUEST_SCHEME"), host,
                 OnlyValue(environment, "REQUEST_URI"));
 }

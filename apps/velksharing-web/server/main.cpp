@@ -151,7 +151,7 @@ int ServeOne() {
   Notebook notebook;
   Service service(settings, FormSecret(settings.runtime_folder), &notebook);
   service.Load();
-  const int status = ServePlainCgi(service);
+  const int status = ServePlainCgi(settings, service);
   if (settings.keeps_audit) notebook.Store(settings);
   return status;
 }

@@ -8,6 +8,7 @@
 #include <cstdlib>
 
 #include "server/answer_head.h"
+#include "server/auth_questions.h"
 #include "server/body_copy.h"
 #include "server/cgi_request.h"
 #include "server/limits.h"
@@ -46,6 +47,12 @@ bool Send(Response &response, Visit &visit) {
   return copied.is_whole;
 }
 
+/// Questions are told apart here, too: what nobody takes for one is answered with a page.
+CgiRequest ReadRequest(const Settings &settings) {
+  if (AuthQuestions::Is(environ, false)) return {AuthQuestions(settings).Read(environ, false), 0};
+  return ReadCgiRequest(environ, &ReadInput);
+}
+
 void CloseOutput() {
   const UniqueFd nothing(open("/dev/null", O_WRONLY | O_CLOEXEC));
   dup2(nothing.get(), STDOUT_FILENO);
@@ -57,10 +64,10 @@ bool IsPlainCgi() {
   return getenv("GATEWAY_INTERFACE") != nullptr && !IsListening(STDIN_FILENO);
 }
 
-int ServePlainCgi(Service &service) {
+int ServePlainCgi(const Settings &settings, Service &service) {
   Visit visit;
   service.Begin();
-  CgiRequest cgi = ReadCgiRequest(environ, &ReadInput);
+  CgiRequest cgi = ReadRequest(settings);
   // A visitor's field Proxy. Authenticators could take it for the proxy that they are to use.
   unsetenv("HTTP_PROXY");
   visit.address = cgi.request.remote_address;

@@ -2,6 +2,7 @@
 #define VELKSHARING_WEB_SERVER_PLAIN_CGI_H
 
 #include "server/service.h"
+#include "server/settings.h"
 
 namespace web {
 
@@ -11,7 +12,7 @@ bool IsPlainCgi();
 /// Answers that request: environment and standard input, to standard output, which is closed then:
 /// the web server has the whole answer, whatever this process does behind it.
 /// @return the process's exit status; not 0 when the answer could not be given whole.
-int ServePlainCgi(Service &service);
+int ServePlainCgi(const Settings &settings, Service &service);
 
 }  // namespace web
 

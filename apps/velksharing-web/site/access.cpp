@@ -7,6 +7,8 @@
 
 #include <algorithm>
 #include <ctime>
+#include <functional>
+#include <map>
 #include <utility>
 
 #include "site/result_names.h"
@@ -28,24 +30,42 @@ const char *FieldText(const Form &form, const char *name) {
   return value == nullptr ? nullptr : value->c_str();
 }
 
+Result CheckResult(int code) {
+  return {code, AuthResultName(code)};
+}
+
+std::optional<Entry> FindLink(const std::string &hash) {
+  Entry link;
+  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link)) return std::nullopt;
+  return link;
+}
+
+bool AsksForAccount(const std::optional<Entry> &link) {
+  return link && link->get_protect_type() == Entry::PROTECT_USER;
+}
+
+/// Whether nothing about a link is different but how often it has been used.
+bool IsUnchanged(const std::optional<Entry> &before, const std::optional<Entry> &after) {
+  if (!before || !after || before->get_id() != after->get_id()) return false;
+  std::map<std::string, std::string> was = before->GetFieldMap();
+  std::map<std::string, std::string> is = after->GetFieldMap();
+  was.erase(VELK::sharing::SZK_USE_COUNT);
+  is.erase(VELK::sharing::SZK_USE_COUNT);
+  return was == is;
+}
+
 int Check(const std::string &hash, const std::string &session_id) {
   const _tag_sharing_login_params params = {hash.c_str(), nullptr, nullptr, nullptr,
                                             session_id.c_str()};
   return VELK::VelkSharingIsAuthorized(&params);
 }
 
-Result Concluded(Transaction &transaction, int code) {
-  if (!transaction.Commit()) code = VELK_SHARING_AUTH_UNUSABLE;
-  return {code, AuthResultName(code)};
-}
-
 /// The grant ends with its session, and with its link.
-std::optional<Grant> FindGrant(const std::string &hash, const std::string &session_id) {
+std::optional<Grant> FindGrant(const Entry &link, const std::string &session_id) {
   SharingDB &db = SharingDB::Instance();
-  Entry link;
   Session session;
   Token token;
-  if (!EntryDB(db).GetByHash(hash, link) || !SessionDB(db).GetBySessionId(session_id, session) ||
+  if (!SessionDB(db).GetBySessionId(session_id, session) ||
       !TokenDB(db).GetBySessionEntry(session, link, token))
     return std::nullopt;
   long end = std::min(session.get_timeout(), token.get_timeout());
@@ -53,26 +73,52 @@ std::optional<Grant> FindGrant(const std::string &hash, const std::string &sessi
   return Grant{session.get_uid(), std::max(end - static_cast<long>(time(nullptr)), 0L)};
 }
 
+/// What is found while a check is held together with it.
+using Finder = std::function<void(const Entry &link)>;
+
+/// @param find runs for a visitor who is in, with the link as it was checked.
+Checked CheckAtOnce(Transaction &transaction, std::optional<Entry> link, const std::string &hash,
+                    const std::string &session_id, const Finder &find) {
+  const int code = Check(hash, session_id);
+  if (code == VELK_SHARING_AUTH_OK && link) find(*link);
+  if (!transaction.Commit()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
+  return {CheckResult(code), std::move(link)};
+}
+
+/// Looking an account's groups up may take seconds, for which no other visitor is to wait. That the
+/// link has stayed the same meanwhile is looked at afterwards.
+Checked CheckWithAccount(const std::optional<Entry> &before, const std::string &hash,
+                         const std::string &session_id, const Finder &find) {
+  const int code = Check(hash, session_id);
+  std::optional<Entry> link = FindLink(hash);
+  if (code == VELK_SHARING_AUTH_OK && !IsUnchanged(before, link))
+    return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
+  if (code == VELK_SHARING_AUTH_OK) find(*link);
+  return {CheckResult(code), std::move(link)};
+}
+
+Checked CheckAndFind(const std::string &hash, const std::string &session_id, const Finder &find) {
+  Transaction transaction;
+  if (!transaction.IsOpen()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
+  std::optional<Entry> link = FindLink(hash);
+  if (!AsksForAccount(link))
+    return CheckAtOnce(transaction, std::move(link), hash, session_id, find);
+  transaction.Commit();
+  return CheckWithAccount(link, hash, session_id, find);
+}
+
 }  // namespace
 
 Checked Authorize(const std::string &hash, const std::string &session_id) {
-  Transaction transaction;
-  const int code = Check(hash, session_id);
-  Checked checked;
-  Entry link;
-  if (EntryDB(SharingDB::Instance()).GetByHash(hash, link)) checked.link = std::move(link);
-  checked.result = Concluded(transaction, code);
-  return checked;
+  return CheckAndFind(hash, session_id, [](const Entry &) {});
 }
 
 GrantChecked AuthorizeGrant(const std::string &hash, const std::string &session_id) {
-  Transaction transaction;
-  const int code = Check(hash, session_id);
   std::optional<Grant> grant;
-  if (code == VELK_SHARING_AUTH_OK) grant = FindGrant(hash, session_id);
-  const Result result = Concluded(transaction, code);
-  if (result.code != VELK_SHARING_AUTH_OK) grant.reset();
-  return {result, grant};
+  const Checked checked = CheckAndFind(
+      hash, session_id, [&](const Entry &link) { grant = FindGrant(link, session_id); });
+  if (checked.result.code != VELK_SHARING_AUTH_OK) grant.reset();
+  return {checked.result, grant};
 }
 
 Result LogIn(const std::string &hash, const Form &form, bool keep_block_state,

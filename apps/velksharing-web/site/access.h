@@ -21,8 +21,9 @@ struct Checked {
 
 /// Checks whether a session may use a link.
 ///
-/// All of it is one transaction: the link is the one that was checked, and the database's write
-/// lock is taken and given back once.
+/// The link is the one that was checked. Where none asks for an account, all of it is one
+/// transaction: the database's write lock is taken and given back once. An account's groups are
+/// looked up without that lock; a link that changes meanwhile makes the check fail as unusable.
 Checked Authorize(const std::string &hash, const std::string &session_id);
 
 /// What a visitor has at a link.

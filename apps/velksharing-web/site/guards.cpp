@@ -2,29 +2,29 @@
 
 #include <syslog.h>
 #include <velksharing/database.h>
-#include <velksharing/store.h>
 
 #include <optional>
-#include <string_view>
+#include <string>
 #include <utility>
 
 namespace web {
 namespace {
 
-using VELK::sharing::db::EntryDB;
 using VELK::sharing::db::Result;
 using VELK::sharing::db::Row;
 using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
 
-// The blob is the text "protects" with its quotation marks: texts become parameters, with which an
-// index like this one could not be used.
+// The index holds the rows that have the word. It needs another name whenever its condition
+// changes: one of this name is left as it is.
 constexpr char kIndex[] =
-    "CREATE INDEX IF NOT EXISTS entry_guards ON entry (id)"
-    " WHERE instr(data, x'2270726F746563747322') > 0";
+    "CREATE INDEX IF NOT EXISTS entry_guards ON entry (id) WHERE instr(data, '\"protects\"') > 0";
+constexpr char kWords[] =
+    "SELECT hash, data FROM entry INDEXED BY entry_guards WHERE instr(data, '\"protects\"') > 0"
+    " ORDER BY id";
 constexpr char kSpeakers[] =
-    "SELECT id, hash, data FROM entry INDEXED BY entry_guards"
-    " WHERE instr(data, x'2270726F746563747322') > 0";
+    "SELECT * FROM entry INDEXED BY entry_guards WHERE instr(data, '\"protects\"') > 0"
+    " ORDER BY id";
 
 /// Every text of `app.protects` that is a prefix.
 /// @param[out] refused receives the first that is none.
@@ -43,9 +43,13 @@ std::vector<gate::Prefix> OwnPrefixes(const Entry &link, std::optional<std::stri
   return prefixes;
 }
 
-std::vector<gate::Prefix> PrefixesOfNewcomer(int id, const std::string &hash) {
+std::vector<gate::Prefix> PrefixesIn(const Row &row) {
+  const int id = row.GetField("id").AsInt(0);
   Entry link;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link)) return {};
+  if (!link.FromRow(row)) {
+    syslog(LOG_WARNING, "link %d: cannot be read, and guards nothing", id);
+    return {};
+  }
   std::optional<std::string> refused;
   std::vector<gate::Prefix> prefixes = OwnPrefixes(link, refused);
   if (refused)
@@ -54,11 +58,22 @@ std::vector<gate::Prefix> PrefixesOfNewcomer(int id, const std::string &hash) {
   return prefixes;
 }
 
-bool ReadSpeakers(Result &result) {
+/// Reads every link to make the index, but does not keep them all in memory.
+bool MakeIndex(SharingDB &db) {
+  Result result;
+  Row row;
+  if (!db.Execute("PRAGMA cache_size", result) || !result.NextRow(row)) return false;
+  const int usual = row.GetField("cache_size").AsInt(0);
+  Result changed;
+  Result changed_back;
+  return db.Execute("PRAGMA cache_size = 100", changed) && db.Execute(kIndex) &&
+         db.Execute("PRAGMA cache_size = " + std::to_string(usual), changed_back);
+}
+
+bool ReadWords(Result &words) {
   SharingDB &db = SharingDB::Instance();
   if (!db.IsGood()) return false;
-  if (db.Execute(kSpeakers, result)) return true;
-  return db.Execute(kIndex) && db.Execute(kSpeakers, result);
+  return db.Execute(kWords, words) || (MakeIndex(db) && db.Execute(kWords, words));
 }
 
 }  // namespace
@@ -68,42 +83,40 @@ Guards::Guards(std::vector<gate::GuardedPrefix> configured) : configured_(std::m
 }
 
 bool Guards::Refresh() {
-  Result result;
-  if (!ReadSpeakers(result)) {
-    TakeIn({});
-    return false;
-  }
-  Speakers speakers;
-  Row row;
-  while (result.NextRow(row)) {
-    const int id = row.GetField("id").AsInt(0);
-    speakers[id] = {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), {}};
-  }
-  TakeIn(std::move(speakers));
-  return true;
+  Result words;
+  if (ReadWords(words) && (AreKnown(words) || ReadAnew())) return true;
+  speakers_.clear();
+  Rebuild();
+  return false;
 }
 
-void Guards::TakeIn(Speakers speakers) {
-  bool is_changed = speakers.size() != speakers_.size();
-  for (auto &[id, speaker] : speakers) {
-    const auto known = speakers_.find(id);
-    if (known != speakers_.end() && known->second.hash == speaker.hash &&
-        known->second.data == speaker.data) {
-      speaker.prefixes = std::move(known->second.prefixes);
-    } else {
-      speaker.prefixes = PrefixesOfNewcomer(id, speaker.hash);
-      is_changed = true;
-    }
+bool Guards::AreKnown(Result &words) const {
+  size_t count = 0;
+  for (Row row; words.NextRow(row); ++count) {
+    if (count == speakers_.size()) return false;
+    const Speaker &known = speakers_[count];
+    if (row.GetField("data").AsString("") != known.data) return false;
+    if (row.GetField("hash").AsString("") != known.hash) return false;
   }
-  speakers_ = std::move(speakers);
-  if (is_changed) Rebuild();
+  return count == speakers_.size();
+}
+
+bool Guards::ReadAnew() {
+  Result result;
+  if (!SharingDB::Instance().Execute(kSpeakers, result)) return false;
+  speakers_.clear();
+  for (Row row; result.NextRow(row);)
+    speakers_.push_back(
+        {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), PrefixesIn(row)});
+  Rebuild();
+  return true;
 }
 
 void Guards::Rebuild() {
   prefixes_ = {};
   for (const gate::GuardedPrefix &guarded : configured_)
     prefixes_.Add(guarded.prefix, guarded.hash);
-  for (const auto &[id, speaker] : speakers_)
+  for (const Speaker &speaker : speakers_)
     for (const gate::Prefix &prefix : speaker.prefixes) prefixes_.Add(prefix, speaker.hash);
 }
 

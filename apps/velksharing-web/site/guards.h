@@ -1,9 +1,9 @@
 #ifndef VELKSHARING_WEB_SITE_GUARDS_H
 #define VELKSHARING_WEB_SITE_GUARDS_H
 
+#include <velksharing/database.h>
 #include <velksharing/record.h>
 
-#include <map>
 #include <string>
 #include <vector>
 
@@ -18,8 +18,8 @@ namespace web {
 /// prefixes), and those that the configuration names. Works on the database of this process.
 ///
 /// The links' own word is read from the database at each Refresh(). An index of the database, which
-/// is made at the first, holds the links that have one, and nobody else pays for the others; what
-/// has not changed since the last time is not parsed again.
+/// is made at the first, holds the links that have one, and nobody else pays for the others. They
+/// are parsed again when any of them has changed since the last time.
 class Guards {
  public:
   explicit Guards(std::vector<gate::GuardedPrefix> configured);
@@ -41,13 +41,13 @@ class Guards {
     std::string data;  ///< As it is stored.
     std::vector<gate::Prefix> prefixes;
   };
-  using Speakers = std::map<int, Speaker>;  ///< By row id.
 
-  void TakeIn(Speakers speakers);
+  bool AreKnown(VELK::sharing::db::Result &words) const;
+  bool ReadAnew();
   void Rebuild();
 
   const std::vector<gate::GuardedPrefix> configured_;
-  Speakers speakers_;
+  std::vector<Speaker> speakers_;  ///< By row id.
   gate::PrefixMap prefixes_;
 };
 

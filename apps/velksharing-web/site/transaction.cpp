@@ -16,7 +16,7 @@ Transaction::~Transaction() {
 }
 
 bool Transaction::Commit() {
-  if (!is_open_) return true;
+  if (!is_open_) return false;
   is_open_ = false;
   const bool is_committed = SharingDB::Instance().Commit();
   turn_.reset();

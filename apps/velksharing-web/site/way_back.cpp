@@ -7,6 +7,7 @@
 
 #include "gate/address.h"
 #include "gate/local_target.h"
+#include "http/host.h"
 
 namespace web {
 namespace {
@@ -16,6 +17,7 @@ namespace {
 std::optional<gate::Address> OnThisSite(const Request &request, const std::string &target) {
   const std::string *host = request.headers.Find("Host");
   if (host == nullptr || request.headers.Count("Host") > 1) return std::nullopt;
+  if (!IsApartFromPath(*host)) return std::nullopt;
   return gate::Address::Parse((request.is_https ? "https://" : "http://") + *host + target);
 }
 
