@@ -29,5 +29,20 @@ CREATE INDEX IF NOT EXISTS entry_used_up ON entry (auto_gc)
 CREATE TABLE IF NOT EXISTS velkdb_relaxed (name TEXT PRIMARY KEY);
 INSERT OR IGNORE INTO velkdb_relaxed VALUES ('session'), ('token');
 
+-- A page asks for many things in the same second, and each of these requests sets the same time-outs.
+-- What would change nothing is not written: neither the row nor its place in five indexes.
+CREATE TRIGGER IF NOT EXISTS session_unchanged BEFORE UPDATE ON session
+  WHEN OLD.session_id IS NEW.session_id AND OLD.uid IS NEW.uid AND OLD.ip IS NEW.ip
+    AND OLD.timeout IS NEW.timeout
+BEGIN
+  SELECT RAISE(IGNORE);
+END;
+CREATE TRIGGER IF NOT EXISTS token_unchanged BEFORE UPDATE ON token
+  WHEN OLD.session_id IS NEW.session_id AND OLD.entry_id IS NEW.entry_id
+    AND OLD.timeout IS NEW.timeout
+BEGIN
+  SELECT RAISE(IGNORE);
+END;
+
 PRAGMA user_version = 2;
 COMMIT;

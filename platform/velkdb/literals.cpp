@@ -23,10 +23,11 @@ bool IsKeyword(std::string_view word, std::string_view keyword) {
 /// Where the values of a kind of statement begin.
 struct Form {
   std::string_view statement;
-  std::string_view values;  ///< The keyword in front of them.
+  std::string_view values;  ///< The keyword in front of them; "" for a statement without.
 };
 constexpr std::array kForms = {Form{"SELECT", "WHERE"}, Form{"INSERT", "VALUES"},
-                               Form{"UPDATE", "SET"}, Form{"DELETE", "WHERE"}};
+                               Form{"UPDATE", "SET"},   Form{"DELETE", "WHERE"},
+                               Form{"BEGIN", ""},       Form{"COMMIT", ""}};
 
 /// Keywords behind which columns get names, or expressions are compared with each other.
 constexpr std::array<std::string_view, 8> kDoubtfulWords = {

@@ -275,6 +275,37 @@ TEST_F(Schema, ADatabaseOfVersionTwoEqualsAFreshOne) {
   EXPECT_EQ(Describe(path_), Describe(Fresh()));
 }
 
+TEST_F(Schema, WhatChangesNothingOfASessionOrGrantIsNotWritten) {
+  const std::string log = Fresh() + "-wal";
+  VelkDbConnection database(Fresh());
+  ASSERT_EQ(database.Run("INSERT INTO session VALUES (NULL,'abc','4294967295','192.0.2.1','100')"),
+            0);
+  ASSERT_EQ(database.Run("INSERT INTO token VALUES (NULL,'1','1','100')"), 0);
+  const auto size = std::filesystem::file_size(log);
+  EXPECT_EQ(database.Run("UPDATE session SET ip='192.0.2.1',session_id='abc',timeout='100',"
+                         "uid='4294967295' WHERE id=1"),
+            0);
+  EXPECT_EQ(database.Run("UPDATE token SET entry_id='1',session_id='1',timeout='100' WHERE id=1"),
+            0);
+  EXPECT_EQ(std::filesystem::file_size(log), size);
+}
+
+TEST_F(Schema, WhateverChangesOfASessionOrGrantIsWritten) {
+  VelkDbConnection database(Fresh());
+  ASSERT_EQ(database.Run("INSERT INTO session VALUES (NULL,'abc','1000',NULL,'100')"), 0);
+  ASSERT_EQ(database.Run("INSERT INTO token VALUES (NULL,'1','1','100')"), 0);
+  for (const char *column : {"session_id='abd'", "uid='1001'", "ip='192.0.2.1'", "timeout='101'"}) {
+    ASSERT_EQ(database.Run(std::string("UPDATE session SET ") + column + " WHERE id=1"), 0);
+    EXPECT_EQ(database.Value(std::string("SELECT COUNT(*) AS n FROM session WHERE ") + column, "n"),
+              "1");
+  }
+  for (const char *column : {"session_id='2'", "entry_id='2'", "timeout='101'"}) {
+    ASSERT_EQ(database.Run(std::string("UPDATE token SET ") + column + " WHERE id=1"), 0);
+    EXPECT_EQ(database.Value(std::string("SELECT COUNT(*) AS n FROM token WHERE ") + column, "n"),
+              "1");
+  }
+}
+
 TEST_F(Schema, MigrationKeepsTheRowsOfVersionOne) {
   std::filesystem::copy_file(OldDatabase(1), path_,
                              std::filesystem::copy_options::overwrite_existing);

@@ -24,7 +24,7 @@ ssize_t ReadAt(int fd, char *buffer, size_t size, off_t offset) {
 }
 
 Copied CopyFile(const FileBody &body, const Sink &sink) {
-  std::vector<char> piece(kPiece);
+  std::vector<char> piece(static_cast<size_t>(std::min<off_t>(body.length, kPiece)));
   off_t done = 0;
   while (done < body.length) {
     const auto wanted = std::min<off_t>(body.length - done, static_cast<off_t>(piece.size()));
