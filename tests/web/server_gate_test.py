@@ -434,7 +434,7 @@ class NginxGate:
         return adapted("nginx/velksharing.conf")
 
     def gate(self):
-        return adapted(self.GATE, *self.gate_changes(), ("_timeout 10s", "_timeout 1s"))
+        return adapted(self.GATE, ("_timeout 10s", "_timeout 1s"))
 
     def start_web_server(self):
         application = self.web_server.write("application.conf",
@@ -451,9 +451,6 @@ class Nginx(NginxGate, GateTests, FrontEndTest):
     GATE = "nginx/velksharing-auth.conf"
     AUTH_ADDRESS = "parameter"
 
-    def gate_changes(self):
-        return []
-
 
 class NginxByHttp(NginxGate, GateTests, FrontEndTest):
     GATE = "nginx/velksharing-auth-http.conf"
@@ -461,9 +458,6 @@ class NginxByHttp(NginxGate, GateTests, FrontEndTest):
 
     def pages(self):
         return ""  # are in the other
-
-    def gate_changes(self):
-        return [(SOCKET, self.socket)]
 
     def listen(self):
         return "--listen", str(self.socket), "--set", "socket_mode=666", "--set", "trusted_proxy=unix"

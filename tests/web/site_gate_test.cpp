@@ -409,6 +409,30 @@ TEST_F(SiteGate, ProtectsThatIsNoListGuardsNothing) {
   }
 }
 
+TEST_F(SiteGate, ALinkThatCannotBeUsedStillGuards) {
+  Store(Guarded("abc", {"/"}));
+  Store(Guarded("def", {"/private"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  RunSql("UPDATE entry SET data = json_set(data, '$.protect_type', 7) WHERE hash = 'def'");
+  const LogCapture quiet;
+  EXPECT_EQ(403, browser.Ask("https://wiki.example/private/a").status);
+  EXPECT_EQ(204, browser.Ask("https://wiki.example/a").status);
+}
+
+TEST_F(SiteGate, ALinkWhoseDataIsBrokenClosesEverything) {
+  Store(Guarded("abc", {"/"}));
+  Store(Guarded("def", {"/private"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  RunSql("UPDATE entry SET data = substr(data, 2) WHERE hash = 'def'");
+  const LogCapture log;
+  EXPECT_EQ(503, browser.Ask("https://wiki.example/a").status);
+  EXPECT_THAT(log.Texts(), testing::Contains(HasSubstr("its data cannot be read")));
+  RunSql("DELETE FROM entry WHERE hash = 'def'");
+  EXPECT_EQ(204, browser.Ask("https://wiki.example/a").status);
+}
+
 TEST_F(SiteGate, AnIndexThatIsGoneIsMadeAnew) {
   Store(Guarded("abc", {"https://wiki.example/"}));
   EXPECT_EQ(401, Visitor().Ask(kWiki).status);

@@ -1,23 +1,11 @@
 #include "server/acceptor.h"
 
-#include <syslog.h>
-
-#include <cerrno>
-#include <chrono>
-#include <cstring>
+#include <utility>
 
 namespace web {
-namespace {
-
-constexpr std::chrono::milliseconds kBreath{100};
-
-}  // namespace
 
 Acceptor::Acceptor(int listening_socket, int room, Taker take)
-    : listening_socket_(listening_socket),
-      take_(std::move(take)),
-      wait_(listening_socket),
-      room_(room) {}
+    : take_(std::move(take)), wait_(listening_socket), room_(room) {}
 
 Acceptor::~Acceptor() {
   Stop();
@@ -57,19 +45,13 @@ void Acceptor::AcceptOne() {
   sockaddr_storage peer = {};
   socklen_t size = sizeof(peer);
   auto *general = reinterpret_cast<sockaddr *>(&peer);
-  UniqueFd connection(accept4(listening_socket_, general, &size, SOCK_CLOEXEC | SOCK_NONBLOCK));
-  if (connection.IsOpen()) {
-    {
-      const std::lock_guard guard(mutex_);
-      --room_;
-    }
-    take_(std::move(connection), general, size);
-    return;
+  UniqueFd connection = wait_.Accept(SOCK_NONBLOCK, general, &size);
+  if (!connection.IsOpen()) return;
+  {
+    const std::lock_guard guard(mutex_);
+    --room_;
   }
-  // Another process was faster, or the visitor has gone; anything else does not end by itself.
-  if (errno == EAGAIN || errno == ECONNABORTED || errno == EINTR) return;
-  syslog(LOG_ERR, "cannot take a connection: %s", strerror(errno));
-  std::this_thread::sleep_for(kBreath);
+  take_(std::move(connection), general, size);
 }
 
 }  // namespace web

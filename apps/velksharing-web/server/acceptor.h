@@ -39,7 +39,6 @@ class Acceptor {
   bool WaitForRoom();
   void AcceptOne();
 
-  const int listening_socket_;
   const Taker take_;
   ListeningWait wait_;
   std::mutex mutex_;

@@ -113,7 +113,6 @@ class FastCgiServerPrivate {
   void Respond(Channel &channel);
   bool Send(Response &response, Channel &channel, Visit &visit);
 
-  const int listening_socket_;
   const FileOffload offload_;
   const AuthQuestions questions_;
   Service &service_;
@@ -126,8 +125,7 @@ class FastCgiServerPrivate {
 
 FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings &settings,
                                            Service &service)
-    : listening_socket_(listening_socket),
-      offload_(settings),
+    : offload_(settings),
       questions_(settings),
       service_(service),
       wait_(listening_socket),
@@ -170,7 +168,7 @@ UniqueFd FastCgiServerPrivate::AcceptConnection() {
   const bool is_there = wait_.Wait();
   --free_threads_;
   if (!is_there) return UniqueFd();
-  return UniqueFd(accept4(listening_socket_, nullptr, nullptr, SOCK_CLOEXEC));
+  return wait_.Accept(0, nullptr, nullptr);
 }
 
 bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {

@@ -2,15 +2,20 @@
 
 #include <sys/epoll.h>
 #include <sys/eventfd.h>
+#include <syslog.h>
 
 #include <cerrno>
+#include <chrono>
+#include <cstring>
 #include <stdexcept>
+#include <thread>
 
 namespace web {
 namespace {
 
 constexpr int kStopped = 0;
 constexpr int kConnection = 1;
+constexpr std::chrono::milliseconds kBreath{100};
 
 bool Watch(const UniqueFd &events, int fd, uint32_t kind, int meaning) {
   epoll_event event = {};
@@ -22,7 +27,9 @@ bool Watch(const UniqueFd &events, int fd, uint32_t kind, int meaning) {
 }  // namespace
 
 ListeningWait::ListeningWait(int listening_socket)
-    : stop_(eventfd(0, EFD_CLOEXEC)), events_(epoll_create1(EPOLL_CLOEXEC)) {
+    : listening_socket_(listening_socket),
+      stop_(eventfd(0, EFD_CLOEXEC)),
+      events_(epoll_create1(EPOLL_CLOEXEC)) {
   if (!stop_.IsOpen() || !events_.IsOpen() || !Watch(events_, stop_.get(), EPOLLIN, kStopped) ||
       !Watch(events_, listening_socket, EPOLLIN | EPOLLEXCLUSIVE, kConnection))
     throw std::runtime_error("cannot wait for connections");
@@ -37,6 +44,16 @@ bool ListeningWait::Wait() const {
   for (int i = 0; i < count; ++i)
     if (happened[i].data.fd == kStopped) return false;
   return true;
+}
+
+UniqueFd ListeningWait::Accept(int flags, sockaddr *peer, socklen_t *size) const {
+  UniqueFd connection(accept4(listening_socket_, peer, size, SOCK_CLOEXEC | flags));
+  // Another process was faster, or the visitor has gone; anything else does not end by itself.
+  if (connection.IsOpen() || errno == EAGAIN || errno == ECONNABORTED || errno == EINTR)
+    return connection;
+  syslog(LOG_ERR, "cannot take a connection: %s", strerror(errno));
+  std::this_thread::sleep_for(kBreath);
+  return connection;
 }
 
 void ListeningWait::Stop() {

@@ -30,10 +30,6 @@ const char *FieldText(const Form &form, const char *name) {
   return value == nullptr ? nullptr : value->c_str();
 }
 
-Result CheckResult(int code) {
-  return {code, AuthResultName(code)};
-}
-
 std::optional<Entry> FindLink(const std::string &hash) {
   Entry link;
   if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link)) return std::nullopt;
@@ -108,6 +104,10 @@ Checked CheckAndFind(const std::string &hash, const std::string &session_id, con
 }
 
 }  // namespace
+
+Result CheckResult(int code) {
+  return {code, AuthResultName(code)};
+}
 
 Checked Authorize(const std::string &hash, const std::string &session_id) {
   return CheckAndFind(hash, session_id, [](const Entry &) {});

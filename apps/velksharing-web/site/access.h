@@ -13,6 +13,9 @@
 
 namespace web {
 
+/// A VelkSharingAuthResult with its name.
+Result CheckResult(int code);
+
 /// What came of a check, with the link as it was at that moment.
 struct Checked {
   Result result;                                     ///< The code is a VelkSharingAuthResult.

@@ -1,8 +1,10 @@
 #include "site/guards.h"
 
+#include <json/reader.h>
 #include <syslog.h>
 #include <velksharing/database.h>
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <utility>
@@ -19,40 +21,37 @@ using VELK::sharing::record::Entry;
 // changes: one of this name is left as it is.
 constexpr char kIndex[] =
     "CREATE INDEX IF NOT EXISTS entry_guards ON entry (id) WHERE instr(data, '\"protects\"') > 0";
-constexpr char kWords[] =
-    "SELECT hash, data FROM entry INDEXED BY entry_guards WHERE instr(data, '\"protects\"') > 0"
-    " ORDER BY id";
 constexpr char kSpeakers[] =
-    "SELECT * FROM entry INDEXED BY entry_guards WHERE instr(data, '\"protects\"') > 0"
-    " ORDER BY id";
+    "SELECT id, hash, data FROM entry INDEXED BY entry_guards"
+    " WHERE instr(data, '\"protects\"') > 0 ORDER BY id";
 
 /// Every text of `app.protects` that is a prefix.
-/// @param[out] refused receives the first that is none.
-std::vector<gate::Prefix> OwnPrefixes(const Entry &link, std::optional<std::string> &refused) {
+/// @param[out] are_all whether there is nothing else in it.
+std::vector<gate::Prefix> OwnPrefixes(const Json::Value &app, bool &are_all) {
   std::vector<gate::Prefix> prefixes;
-  const Json::Value app = link.get_app();
+  are_all = true;
   if (!app.isObject() || !app["protects"].isArray()) return prefixes;
   for (const Json::Value &value : app["protects"]) {
     auto prefix = value.isString() ? gate::Prefix::Parse(value.asString()) : std::nullopt;
-    if (prefix) {
-      prefixes.push_back(std::move(*prefix));
-    } else if (!refused) {
-      refused = value.isString() ? value.asString() : "a value that is no text";
-    }
+    if (prefix) prefixes.push_back(std::move(*prefix));
+    are_all = are_all && prefix;
   }
   return prefixes;
 }
 
-std::vector<gate::Prefix> PrefixesIn(const Row &row) {
-  const int id = row.GetField("id").AsInt(0);
-  Entry link;
-  if (!link.FromRow(row)) {
-    syslog(LOG_WARNING, "link %d: cannot be read, and guards nothing", id);
-    return {};
+/// What a row's link says. It guards that also where it is no link that lets anybody in.
+/// @return nothing for what cannot be read: then nobody knows what it guards.
+std::optional<std::vector<gate::Prefix>> PrefixesIn(int id, const std::string &data) {
+  Json::Value document;
+  const std::unique_ptr<Json::CharReader> reader(Json::CharReaderBuilder().newCharReader());
+  if (!reader->parse(data.data(), data.data() + data.size(), &document, nullptr) ||
+      !document.isObject()) {
+    syslog(LOG_ERR, "link %d: its data cannot be read; nobody gets through the gate", id);
+    return std::nullopt;
   }
-  std::optional<std::string> refused;
-  std::vector<gate::Prefix> prefixes = OwnPrefixes(link, refused);
-  if (refused)
+  bool are_all = false;
+  std::vector<gate::Prefix> prefixes = OwnPrefixes(document["app"], are_all);
+  if (!are_all)
     syslog(LOG_WARNING, "link %d: what it says to protect is no prefix of addresses, and ignored",
            id);
   return prefixes;
@@ -66,14 +65,14 @@ bool MakeIndex(SharingDB &db) {
   const int usual = row.GetField("cache_size").AsInt(0);
   Result changed;
   Result changed_back;
-  return db.Execute("PRAGMA cache_size = 100", changed) && db.Execute(kIndex) &&
-         db.Execute("PRAGMA cache_size = " + std::to_string(usual), changed_back);
+  const bool is_made = db.Execute("PRAGMA cache_size = 100", changed) && db.Execute(kIndex);
+  return db.Execute("PRAGMA cache_size = " + std::to_string(usual), changed_back) && is_made;
 }
 
-bool ReadWords(Result &words) {
+bool ReadSpeakers(Result &rows) {
   SharingDB &db = SharingDB::Instance();
   if (!db.IsGood()) return false;
-  return db.Execute(kWords, words) || (MakeIndex(db) && db.Execute(kWords, words));
+  return db.Execute(kSpeakers, rows) || (MakeIndex(db) && db.Execute(kSpeakers, rows));
 }
 
 }  // namespace
@@ -83,16 +82,16 @@ Guards::Guards(std::vector<gate::GuardedPrefix> configured) : configured_(std::m
 }
 
 bool Guards::Refresh() {
-  Result words;
-  if (ReadWords(words) && (AreKnown(words) || ReadAnew())) return true;
+  Result rows;
+  if (ReadSpeakers(rows) && (AreKnown(rows) || ReadAnew())) return true;
   speakers_.clear();
   Rebuild();
   return false;
 }
 
-bool Guards::AreKnown(Result &words) const {
+bool Guards::AreKnown(Result &rows) const {
   size_t count = 0;
-  for (Row row; words.NextRow(row); ++count) {
+  for (Row row; rows.NextRow(row); ++count) {
     if (count == speakers_.size()) return false;
     const Speaker &known = speakers_[count];
     if (row.GetField("data").AsString("") != known.data) return false;
@@ -102,12 +101,16 @@ bool Guards::AreKnown(Result &words) const {
 }
 
 bool Guards::ReadAnew() {
-  Result result;
-  if (!SharingDB::Instance().Execute(kSpeakers, result)) return false;
+  Result rows;
+  if (!ReadSpeakers(rows)) return false;
   speakers_.clear();
-  for (Row row; result.NextRow(row);)
-    speakers_.push_back(
-        {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), PrefixesIn(row)});
+  for (Row row; rows.NextRow(row);) {
+    Speaker speaker = {row.GetField("hash").AsString(""), row.GetField("data").AsString(""), {}};
+    auto prefixes = PrefixesIn(row.GetField("id").AsInt(0), speaker.data);
+    if (!prefixes) return false;
+    speaker.prefixes = std::move(*prefixes);
+    speakers_.push_back(std::move(speaker));
+  }
   Rebuild();
   return true;
 }
@@ -125,8 +128,8 @@ const std::vector<std::string> &Guards::Find(const gate::Address &address) const
 }
 
 std::vector<gate::Prefix> Guards::PrefixesOf(const Entry &link) const {
-  std::optional<std::string> refused;
-  std::vector<gate::Prefix> prefixes = OwnPrefixes(link, refused);
+  bool are_all = false;
+  std::vector<gate::Prefix> prefixes = OwnPrefixes(link.get_app(), are_all);
   for (const gate::GuardedPrefix &guarded : configured_)
     if (guarded.hash == link.get_hash()) prefixes.push_back(guarded.prefix);
   return prefixes;

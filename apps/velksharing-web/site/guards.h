@@ -25,7 +25,7 @@ class Guards {
   explicit Guards(std::vector<gate::GuardedPrefix> configured);
 
   /// Brings everything up to what the database says now. To be called before each Find().
-  /// @return false when the database cannot be read; nothing is known then.
+  /// @return false when the database, or what a link says, cannot be read; nothing is known then.
   bool Refresh();
 
   /// The hashes of the links that guard an address; see gate::PrefixMap::Find().
@@ -42,7 +42,7 @@ class Guards {
     std::vector<gate::Prefix> prefixes;
   };
 
-  bool AreKnown(VELK::sharing::db::Result &words) const;
+  bool AreKnown(VELK::sharing::db::Result &rows) const;
   bool ReadAnew();
   void Rebuild();
 

@@ -36,10 +36,6 @@ bool MayLackItsAccount(const Link &link) {
   return link.entry.get_protect_type() == Entry::PROTECT_USER && DatabaseAnswers();
 }
 
-Result CheckResult(int code) {
-  return {code, AuthResultName(code)};
-}
-
 Result LoginResult(int code) {
   return {code, LoginResultName(code)};
 }
