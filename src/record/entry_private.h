@@ -4,13 +4,15 @@
 #include <string>
 #include <vector>
 
+#include "record/entry_data.h"
 #include "velksharing/constants.h"
 #include "velksharing/record.h"
 
 namespace VELK::sharing::record {
 
-/// All that a link is. entry_private.cpp holds its stored form, entry_rules.cpp its rules.
-class EntryPrivate : public Object {
+/// All that a link is. entry_private.cpp holds its stored form, entry_rules.cpp its rules, and
+/// entry_data.cpp what one column keeps for it.
+class EntryPrivate : public Object, public EntryData {
  public:
   EntryPrivate() = default;
   EntryPrivate(const EntryPrivate &other) = default;
@@ -64,26 +66,9 @@ class EntryPrivate : public Object {
   int expire_times_ = 0;
   int use_count_ = 0;
   bool auto_gc_ = true;
-  bool enable_match_ip_ = true;
-  Entry::ProtectType protect_type_ = Entry::PROTECT_NONE;
-  std::string protect_title_;
-  std::string protect_password_;
-  std::string protect_password_salt_;
-  Entry::PasswordEncryptAlgo protect_password_algo_ = Entry::ENCRYPT_ALGO_DEFAULT;
-  std::vector<unsigned int> protect_uids_;
-  std::vector<std::string> protect_extra_users_;  ///< Permitted, but without a uid when set.
-  std::vector<unsigned int> protect_gids_;
-  std::vector<std::string> protect_extra_groups_;  ///< Permitted, but without a gid when set.
-  Entry::RedirectType redirect_type_ = Entry::REDIRECT_NONE;
-  std::string redirect_uri_;
-  Json::Value app_;  ///< Null at first: the application has to set it.
-  Json::Value private_data_{Json::objectValue};
 
  private:
   void CopyPlainFields(const EntryPrivate &other);
-  Json::Value DataToJson() const;
-  /// Takes what it can use over from `data`. Throws Json::LogicError for members of other types.
-  void DataFromJson(Json::Value &data);
 };
 
 }  // namespace VELK::sharing::record

@@ -3,10 +3,13 @@
 #include <velksharing/constants.h>
 #include <velksharing/record.h>
 
+#include <atomic>
 #include <climits>
 #include <memory>
 #include <sstream>
+#include <thread>
 #include <utility>
+#include <vector>
 
 #include "support/log_capture.h"
 #include "support/log_matcher.h"
@@ -429,6 +432,59 @@ TEST(Entry, LoadsTheListsInTheirOrder) {
   EXPECT_EQ(Parsed(R"(["zoe","ann"])"), data["protect_extra_users"]);
   EXPECT_EQ(Parsed("[9,8]"), data["protect_gids"]);
   EXPECT_EQ(Parsed(R"(["b","a"])"), data["protect_extra_groups"]);
+}
+
+TEST(Entry, LoadsTheSameDataAnewForEachRecord) {
+  const std::string data =
+      R"({"protect_type":"none","protect_title":"Family","app":{"path":"/a"}})";
+  EntryRecord changed;
+  ASSERT_TRUE(LoadsData(changed, data));
+  Json::Value app = changed.get_app();
+  app["path"] = "/b";
+  changed.set_app(app).set_protect_title("Work");
+  EntryRecord loaded;
+  ASSERT_TRUE(LoadsData(loaded, data));
+  EXPECT_EQ("Family", loaded.get_protect_title());
+  EXPECT_EQ("/a", loaded.get_app()["path"].asString());
+}
+
+TEST(Entry, LoadsManyDifferentDataMoreThanOnce) {
+  const auto title = [](int number) { return "Title " + std::to_string(number % 50); };
+  for (int number = 0; number < 150; ++number) {
+    EntryRecord entry;
+    const std::string data =
+        R"({"protect_type":"none","app":{},"protect_title":")" + title(number) + "\"}";
+    ASSERT_TRUE(LoadsData(entry, data));
+    EXPECT_EQ(title(number), entry.get_protect_title());
+  }
+}
+
+TEST(Entry, LoadsLargeDataMoreThanOnce) {
+  const std::string title(100'000, 'x');
+  for (int turn = 0; turn < 2; ++turn) {
+    EntryRecord entry;
+    const std::string data = R"({"protect_type":"none","app":{},"protect_title":")" + title + "\"}";
+    ASSERT_TRUE(LoadsData(entry, data));
+    EXPECT_EQ(title, entry.get_protect_title());
+  }
+}
+
+TEST(Entry, LoadsInSeveralThreadsAtOnce) {
+  std::atomic<int> wrong = 0;
+  const auto load = [&](int first) {
+    for (int number = first; number < first + 1000; ++number) {
+      const std::string title = std::to_string(number % 30);
+      EntryRecord entry;
+      const bool is_loaded = Loads(
+          entry,
+          ColumnsWith(R"({"protect_type":"none","app":{},"protect_title":")" + title + "\"}"));
+      if (!is_loaded || entry.get_protect_title() != title) ++wrong;
+    }
+  };
+  std::vector<std::thread> threads;
+  for (int first = 0; first < 4; ++first) threads.emplace_back(load, first);
+  for (std::thread &thread : threads) thread.join();
+  EXPECT_EQ(0, wrong);
 }
 
 TEST(Entry, RefusesDataThatIsNoJson) {
