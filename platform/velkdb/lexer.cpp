@@ -30,6 +30,13 @@ CharacterClass ClassOf(char c) {
   return kClasses[static_cast<unsigned char>(c)];
 }
 
+/// Most of a statement is words.
+size_t EndOfWord(std::string_view text, size_t at) {
+  const auto goes_on = [](char c) { return ClassOf(c) == kLetter || ClassOf(c) == kDigit; };
+  while (at < text.size() && goes_on(text[at])) ++at;
+  return at;
+}
+
 }  // namespace
 
 Token Lexer::Next() {
@@ -63,7 +70,7 @@ Token::Kind Lexer::Read(char first) {
 
 Token::Kind Lexer::ReadWord() {
   const size_t start = at_ - 1;
-  while (ClassOf(Peek()) == kLetter || ClassOf(Peek()) == kDigit) ++at_;
+  at_ = EndOfWord(text_, at_);
   // x'00' is a blob.
   const bool is_blob = at_ - start == 1 && (text_[start] | ' ') == 'x' && Peek() == '\'';
   return is_blob || GoesOn() ? Token::kDoubtful : Token::kWord;

@@ -25,7 +25,8 @@ struct LiftedText {
 };
 
 /// Lifts string and integer literals out of one SELECT, INSERT, UPDATE or DELETE, so that
-/// statements which differ in their values alone share one text. BEGIN and COMMIT have none.
+/// statements which differ in their values alone share one text. BEGIN, COMMIT and PRAGMA
+/// data_version have none.
 ///
 /// Takes only literals whose place can hold nothing but a value: those behind a comparison or an
 /// assignment, the items of VALUES, the number of OFFSET. Others stay: they may name a column

@@ -103,6 +103,15 @@ TEST_F(VelkDbStatements, WhatIsNotSureIsNotKept) {
       IsEmpty());
 }
 
+TEST_F(VelkDbStatements, ThePragmaThatTellsOfOthersChangesIsKeptAndTells) {
+  const auto version = [&] { return connection_->Value("PRAGMA data_version", "data_version"); };
+  const std::string before = version();
+  EXPECT_THAT(Kept(), ElementsAre("PRAGMA data_version"));
+  EXPECT_EQ(version(), before);
+  ASSERT_EQ(VelkDbConnection(path_).Run("INSERT INTO item VALUES (7, 'seven', 7)"), 0);
+  EXPECT_NE(version(), before);
+}
+
 TEST_F(VelkDbStatements, WrongOnesAreNotKept) {
   EXPECT_THAT(KeptAfter({"SELECT n FROM item WHERE nothing = 5", "SELECT FROM item WHERE n = 5"}),
               IsEmpty());
