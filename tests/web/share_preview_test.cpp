@@ -67,6 +67,26 @@ TEST(SharePreview, ATextWithControlCharactersIsNotShown) {
   EXPECT_EQ(PreviewWith("a.txt", std::string("a\0b", 3)), PreviewKind::OTHER);
 }
 
+TEST(SharePreview, EveryControlCharacterIsKnownWhereverItStands) {
+  const SharedFolder folder;
+  for (int code = 0; code < 0x80; ++code) {
+    const bool is_text =
+        (code >= 0x20 && code != 0x7F) ||
+        std::string_view("\t\n\r\f\b\x1B").find(static_cast<char>(code)) != std::string::npos;
+    const auto before = static_cast<size_t>(code % 20);
+    folder.AddFile("a.txt", std::string(before, 'a') + static_cast<char>(code) + "b");
+    EXPECT_EQ(ReadText(folder.Find({"a.txt"}), 100).has_value(), is_text) << code;
+  }
+}
+
+TEST(SharePreview, CharactersBeyondAsciiAreTextWhereverTheyStand) {
+  const SharedFolder folder;
+  for (size_t before = 0; before < 20; ++before) {
+    folder.AddFile("a.txt", std::string(before, 'a') + "ä€\xF0\x9F\x98\x80" + "b");
+    EXPECT_TRUE(ReadText(folder.Find({"a.txt"}), 100)) << before;
+  }
+}
+
 TEST(SharePreview, AFolderHasNone) {
   const SharedFolder folder;
   folder.AddFolder("a.txt");
@@ -128,6 +148,14 @@ TEST_P(ShareBrokenUtf8, IsNoText) {
   const SharedFolder folder;
   folder.AddFile("a.txt", "a" + GetParam() + "b");
   EXPECT_FALSE(ReadText(folder.Find({"a.txt"}), 100));
+}
+
+TEST_P(ShareBrokenUtf8, IsFoundWhereverItStands) {
+  const SharedFolder folder;
+  for (size_t before = 0; before < 20; ++before) {
+    folder.AddFile("a.txt", std::string(before, 'a') + GetParam() + std::string(20, 'b'));
+    EXPECT_FALSE(ReadText(folder.Find({"a.txt"}), 100)) << before;
+  }
 }
 
 INSTANTIATE_TEST_SUITE_P(SharePreview, ShareBrokenUtf8,

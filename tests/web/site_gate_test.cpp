@@ -4,6 +4,8 @@
 
 #include "site_support.h"
 #include "support/log_capture.h"
+#include "support/raw_database.h"
+#include "support/velk_root.h"
 
 namespace {
 
@@ -277,6 +279,23 @@ TEST_F(SiteGate, WhatALinkBeginsToGuardItGuardsWithTheNextRequest) {
   EXPECT_EQ(204, browser.Ask("https://wiki.example/private/a").status);
 }
 
+TEST_F(SiteGate, WhatOtherProgramsChangeCountsFromTheNextRequestOn) {
+  Store(Guarded("abc", {"/"}));
+  Store(Guarded("def", {"/private"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  velk_test::RawDatabase others(velk_test::SharingDatabasePath());
+  for (int turn = 0; turn < 3; ++turn) {
+    EXPECT_EQ(401, browser.Ask("https://wiki.example/private/a").status);
+    others.Run("UPDATE entry SET data = replace(data, '/private', '/secret') WHERE hash = 'def'");
+    EXPECT_EQ(204, browser.Ask("https://wiki.example/private/a").status);
+    EXPECT_EQ(401, browser.Ask("https://wiki.example/secret/a").status);
+    others.Run("UPDATE entry SET data = replace(data, '/secret', '/private') WHERE hash = 'def'");
+  }
+  others.Run("DELETE FROM entry WHERE hash = 'abc'");
+  EXPECT_EQ(403, browser.Ask("https://wiki.example/a").status);
+}
+
 TEST_F(SiteGate, LoggingOutEndsIt) {
   Store(Guarded("abc", {"https://wiki.example/"}));
   Browser browser = Visitor();
@@ -436,7 +455,7 @@ TEST_F(SiteGate, ALinkWhoseDataIsBrokenClosesEverything) {
 TEST_F(SiteGate, AnIndexThatIsGoneIsMadeAnew) {
   Store(Guarded("abc", {"https://wiki.example/"}));
   EXPECT_EQ(401, Visitor().Ask(kWiki).status);
-  RunSql("DROP INDEX entry_guards");
+  velk_test::RawDatabase(velk_test::SharingDatabasePath()).Run("DROP INDEX entry_guards");
   EXPECT_EQ(401, Visitor().Ask(kWiki).status);
   EXPECT_EQ("1", Value("SELECT COUNT(*) FROM sqlite_master WHERE name = 'entry_guards'"));
 }

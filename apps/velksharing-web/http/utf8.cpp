@@ -1,6 +1,7 @@
 #include "http/utf8.h"
 
 #include <cstdint>
+#include <cstring>
 
 namespace web {
 namespace {
@@ -49,6 +50,17 @@ size_t PlausibleBytes(std::string_view text, size_t length) {
   return count;
 }
 
+// Of the ASCII characters that it begins with; up to seven fewer, for they are looked at in eights.
+size_t AsciiLength(std::string_view text) {
+  constexpr uint64_t kBeyondAscii = 0x8080808080808080;
+  size_t length = 0;
+  for (uint64_t bytes = 0; length + sizeof bytes <= text.size(); length += sizeof bytes) {
+    memcpy(&bytes, text.data() + length, sizeof bytes);
+    if ((bytes & kBeyondAscii) != 0) break;
+  }
+  return length;
+}
+
 }  // namespace
 
 size_t Utf8CharacterLength(std::string_view text) {
@@ -59,8 +71,12 @@ size_t Utf8CharacterLength(std::string_view text) {
 
 size_t Utf8Length(std::string_view text) {
   size_t length = 0;
-  while (const size_t step = Utf8CharacterLength(text.substr(length))) length += step;
-  return length;
+  while (true) {
+    length += AsciiLength(text.substr(length));
+    const size_t step = Utf8CharacterLength(text.substr(length));
+    if (step == 0) return length;
+    length += step;
+  }
 }
 
 bool IsCutUtf8Character(std::string_view rest) {

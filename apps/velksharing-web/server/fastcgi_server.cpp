@@ -74,7 +74,9 @@ void Channel::Adopt(UniqueFd connection) {
 }
 
 bool Channel::Finish() {
-  const bool is_sent = FCGX_FFlush(request_.out) == 0;
+  // The stream that is closed last takes the end of the request along, and tells how that went.
+  FCGX_FClose(request_.err);
+  const bool is_sent = FCGX_FClose(request_.out) == 0;
   FCGX_Finish_r(&request_);
   return is_sent;
 }
@@ -145,11 +147,14 @@ FastCgiServerPrivate::~FastCgiServerPrivate() {
 
 void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
   Channel channel;
-  while (!IsStopped()) {
-    if (!AcceptNext(channel)) continue;
-    connection = channel.connection();
-    Respond(channel);
-    connection = -1;
+  while (true) {
+    if (AcceptNext(channel)) {
+      connection = channel.connection();
+      Respond(channel);
+      connection = -1;
+    } else if (IsStopped()) {
+      return;
+    }
   }
 }
 

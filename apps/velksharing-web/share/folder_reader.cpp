@@ -14,7 +14,7 @@ std::optional<FolderReader> FolderReader::Open(const TreeRoot &root,
                                                const std::vector<std::string> &parts) {
   std::string path = RelativePath(parts);
   UniqueFd file = OpenBeneath(root, path);
-  if (!file.IsOpen() || !StatServed(file)) return std::nullopt;
+  if (!file.IsOpen() || !StatServed(file, root.device)) return std::nullopt;
   DIR *folder = fdopendir(file.get());
   if (folder == nullptr) return std::nullopt;
   file.Release();

@@ -102,8 +102,16 @@ bool ChangeIds(const FileRights &from, const FileRights &to) {
          (from.gid == to.gid || SetFileGid(to.gid)) && (from.uid == to.uid || SetFileUid(to.uid));
 }
 
+/// The kernel asks for the group id before it looks at the groups, so these need not name it. Then
+/// most accounts have none, as this process, and there is nothing to change.
+std::vector<gid_t> FurtherGroups(const Owner &owner) {
+  std::vector<gid_t> groups = owner.groups;
+  std::erase(groups, owner.gid);
+  return groups;
+}
+
 FileRights RightsOf(const Owner &owner, const FileRights &current) {
-  return {owner.uid, owner.gid, owner.groups, current.capabilities & ~kPastPermissions};
+  return {owner.uid, owner.gid, FurtherGroups(owner), current.capabilities & ~kPastPermissions};
 }
 
 }  // namespace

@@ -41,10 +41,22 @@ PreviewKind PreviewByType(std::string_view type) {
 }
 
 // A text may have lines, tabs and pages, and the escapes that terminals know.
-bool IsControl(char byte) {
+constexpr bool IsControl(char byte) {
   constexpr std::string_view kAllowed = "\t\n\r\f\b\x1B";
   const auto code = static_cast<unsigned char>(byte);
   return (code < 0x20 || code == 0x7F) && kAllowed.find(byte) == std::string_view::npos;
+}
+
+constexpr std::array<bool, 256> kIsControl = [] {
+  std::array<bool, 256> is_control{};
+  for (size_t code = 0; code < is_control.size(); ++code)
+    is_control[code] = IsControl(static_cast<char>(code));
+  return is_control;
+}();
+
+bool HasControl(std::string_view text) {
+  return std::ranges::any_of(
+      text, [](char byte) { return kIsControl[static_cast<unsigned char>(byte)]; });
 }
 
 }  // namespace
@@ -65,7 +77,7 @@ PreviewKind PreviewOf(const Item &file) {
 std::optional<TextStart> ReadText(const Item &file, size_t limit) {
   if (file.is_folder) return std::nullopt;
   std::optional<std::string> start = ReadStart(file, limit);
-  if (!start || std::any_of(start->begin(), start->end(), IsControl)) return std::nullopt;
+  if (!start || HasControl(*start)) return std::nullopt;
   const bool is_cut = static_cast<off_t>(start->size()) < file.size;
   const size_t length = Utf8Length(*start);
   const bool is_text = length == start->size() ||

@@ -88,6 +88,7 @@ std::optional<SharedTree> SharedTree::OpenEntered(const std::string &path, const
     LogUnusable(path, owner.uid, "neither a file nor a folder of files");
     return std::nullopt;
   }
+  root->device = status->st_dev;
   root->is_folder = S_ISDIR(status->st_mode);
   root->name = LastPart(path);
   return SharedTree(std::move(root));
@@ -109,7 +110,8 @@ std::optional<Item> SharedTree::Find(const std::vector<std::string> &parts) cons
 std::optional<Item> SharedTree::FindEntered(const std::vector<std::string> &parts) const {
   if (!std::all_of(parts.begin(), parts.end(), IsVisibleName)) return std::nullopt;
   UniqueFd file = Reopen(*root_, parts);
-  const std::optional<struct stat> status = file.IsOpen() ? StatServed(file) : std::nullopt;
+  if (!file.IsOpen()) return std::nullopt;
+  const std::optional<struct stat> status = StatServed(file, root_->device);
   if (!status) return std::nullopt;
   Item item;
   item.parts = parts;

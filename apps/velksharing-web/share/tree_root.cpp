@@ -73,10 +73,10 @@ bool IsFileOrFolder(const struct stat &status) {
   return S_ISREG(status.st_mode) || S_ISDIR(status.st_mode);
 }
 
-std::optional<struct stat> StatServed(const UniqueFd &file) {
+std::optional<struct stat> StatServed(const UniqueFd &file, std::optional<dev_t> served) {
   struct stat status = {};
-  if (fstat(file.get(), &status) != 0) return std::nullopt;
-  if (!IsFileOrFolder(status) || IsOnProcfs(file)) return std::nullopt;
+  if (fstat(file.get(), &status) != 0 || !IsFileOrFolder(status)) return std::nullopt;
+  if (status.st_dev != served && IsOnProcfs(file)) return std::nullopt;
   return status;
 }
 

@@ -18,6 +18,7 @@ namespace web::share {
 struct TreeRoot {
   Owner owner;
   UniqueFd file;
+  dev_t device = 0;
   bool is_folder = false;
   std::string name;
 };
@@ -42,9 +43,11 @@ std::optional<struct stat> StatBeneath(const TreeRoot &root, const std::string &
 bool IsFileOrFolder(const struct stat &status);
 
 /// Tells what is open.
+/// @param served a device of which it is known that visitors may get at its files.
 /// @return nothing for what visitors do not get at: what is neither file nor folder, and what tells
 ///         about the process that reads it rather than about the owner's files.
-std::optional<struct stat> StatServed(const UniqueFd &file);
+std::optional<struct stat> StatServed(const UniqueFd &file,
+                                      std::optional<dev_t> served = std::nullopt);
 
 }  // namespace web::share
 

@@ -3,12 +3,12 @@
 #include <velksharing/access.h>
 #include <velksharing/constants.h>
 #include <velksharing/database.h>
-#include <velksharing/store.h>
 
 #include <algorithm>
 #include <ctime>
 #include <functional>
 #include <map>
+#include <string>
 #include <utility>
 
 #include "site/result_names.h"
@@ -17,31 +17,21 @@
 namespace web {
 namespace {
 
-using VELK::sharing::db::EntryDB;
-using VELK::sharing::db::SessionDB;
+using VELK::sharing::UID_ERR;
 using VELK::sharing::db::SharingDB;
-using VELK::sharing::db::TokenDB;
 using VELK::sharing::record::Entry;
-using VELK::sharing::record::Session;
-using VELK::sharing::record::Token;
 
 const char *FieldText(const Form &form, const char *name) {
   const std::string *value = form.Find(name);
   return value == nullptr ? nullptr : value->c_str();
 }
 
-std::optional<Entry> FindLink(const std::string &hash) {
-  Entry link;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, link)) return std::nullopt;
-  return link;
-}
-
-bool AsksForAccount(const std::optional<Entry> &link) {
+bool AsksForAccount(const EntryPointer &link) {
   return link && link->get_protect_type() == Entry::PROTECT_USER;
 }
 
 /// Whether nothing about a link is different but how often it has been used.
-bool IsUnchanged(const std::optional<Entry> &before, const std::optional<Entry> &after) {
+bool IsUnchanged(const EntryPointer &before, const EntryPointer &after) {
   if (!before || !after || before->get_id() != after->get_id()) return false;
   std::map<std::string, std::string> was = before->GetFieldMap();
   std::map<std::string, std::string> is = after->GetFieldMap();
@@ -59,44 +49,48 @@ int Check(const std::string &hash, const std::string &session_id) {
 /// The grant ends with its session, and with its link.
 std::optional<Grant> FindGrant(const Entry &link, const std::string &session_id) {
   SharingDB &db = SharingDB::Instance();
-  Session session;
-  Token token;
-  if (!SessionDB(db).GetBySessionId(session_id, session) ||
-      !TokenDB(db).GetBySessionEntry(session, link, token))
-    return std::nullopt;
-  long end = std::min(session.get_timeout(), token.get_timeout());
+  VELK::sharing::db::Result grants;
+  VELK::sharing::db::Row grant;
+  const bool is_read = db.Execute(
+      "SELECT uid, min(session.timeout, token.timeout) AS timeout FROM session"
+      " JOIN token ON token.session_id = session.id WHERE session.session_id = '" +
+          db.Escape(session_id) + "' AND token.entry_id = " + std::to_string(link.get_id()),
+      grants);
+  if (!is_read || !grants.NextRow(grant)) return std::nullopt;
+  long end = grant.GetField("timeout").AsTime(0);
   if (link.get_expire_at() > 0) end = std::min(end, link.get_expire_at());
-  return Grant{session.get_uid(), std::max(end - static_cast<long>(time(nullptr)), 0L)};
+  return Grant{grant.GetField("uid").AsUInt(UID_ERR),
+               std::max(end - static_cast<long>(time(nullptr)), 0L)};
 }
 
 /// What is found while a check is held together with it.
 using Finder = std::function<void(const Entry &link)>;
 
 /// @param find runs for a visitor who is in, with the link as it was checked.
-Checked CheckAtOnce(Transaction &transaction, std::optional<Entry> link, const std::string &hash,
+Checked CheckAtOnce(Transaction &transaction, EntryPointer link, const std::string &hash,
                     const std::string &session_id, const Finder &find) {
   const int code = Check(hash, session_id);
   if (code == VELK_SHARING_AUTH_OK && link) find(*link);
-  if (!transaction.Commit()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
+  if (!transaction.Commit()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), nullptr};
   return {CheckResult(code), std::move(link)};
 }
 
 /// Looking an account's groups up may take seconds, for which no other visitor is to wait. That the
 /// link has stayed the same meanwhile is looked at afterwards.
-Checked CheckWithAccount(const std::optional<Entry> &before, const std::string &hash,
+Checked CheckWithAccount(const EntryPointer &before, const std::string &hash,
                          const std::string &session_id, const Finder &find) {
   const int code = Check(hash, session_id);
-  std::optional<Entry> link = FindLink(hash);
+  EntryPointer link = FindEntry(hash);
   if (code == VELK_SHARING_AUTH_OK && !IsUnchanged(before, link))
-    return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
+    return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), nullptr};
   if (code == VELK_SHARING_AUTH_OK) find(*link);
   return {CheckResult(code), std::move(link)};
 }
 
 Checked CheckAndFind(const std::string &hash, const std::string &session_id, const Finder &find) {
   Transaction transaction;
-  if (!transaction.IsOpen()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), std::nullopt};
-  std::optional<Entry> link = FindLink(hash);
+  if (!transaction.IsOpen()) return {CheckResult(VELK_SHARING_AUTH_UNUSABLE), nullptr};
+  EntryPointer link = FindEntry(hash);
   if (!AsksForAccount(link))
     return CheckAtOnce(transaction, std::move(link), hash, session_id, find);
   transaction.Commit();

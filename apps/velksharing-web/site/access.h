@@ -1,13 +1,12 @@
 #ifndef VELKSHARING_WEB_SITE_ACCESS_H
 #define VELKSHARING_WEB_SITE_ACCESS_H
 
-#include <velksharing/record.h>
-
 #include <optional>
 #include <string>
 
 #include "http/form.h"
 #include "site/answers.h"
+#include "site/find_entry.h"
 
 /// The access API for the platform's current request, with the names of its results.
 
@@ -18,8 +17,8 @@ Result CheckResult(int code);
 
 /// What came of a check, with the link as it was at that moment.
 struct Checked {
-  Result result;                                     ///< The code is a VelkSharingAuthResult.
-  std::optional<VELK::sharing::record::Entry> link;  ///< Nothing for one that cannot be read.
+  Result result;      ///< The code is a VelkSharingAuthResult.
+  EntryPointer link;  ///< Null for one that cannot be read.
 };
 
 /// Checks whether a session may use a link.

@@ -1,7 +1,7 @@
 #include "site/cgi_environment.h"
 
 #include <algorithm>
-#include <map>
+#include <utility>
 
 #include "http/wipe.h"
 
@@ -17,23 +17,32 @@ bool IsOneLine(std::string_view value) {
   return value.find_first_of(std::string_view("\0\r\n", 3)) == std::string_view::npos;
 }
 
-std::map<std::string, std::string> Variables(const Request &request) {
-  std::map<std::string, std::string> variables = {
+struct Variable {
+  std::string name;
+  std::string value;
+};
+
+std::vector<Variable> Variables(const Request &request) {
+  std::vector<Variable> variables = {
       {"GATEWAY_INTERFACE", "CGI/1.1"},
       {"REMOTE_ADDR", request.remote_address},
       {"REQUEST_METHOD", request.method},
       {"QUERY_STRING", request.query},
   };
-  if (request.is_https) variables["HTTPS"] = "on";
+  if (request.is_https) variables.push_back({"HTTPS", "on"});
   if (!request.body.empty()) {
-    variables["CONTENT_LENGTH"] = std::to_string(request.body.size());
-    variables["CONTENT_TYPE"] = request.headers.Get("Content-Type");
+    variables.push_back({"CONTENT_LENGTH", std::to_string(request.body.size())});
+    variables.push_back({"CONTENT_TYPE", std::string(request.headers.Get("Content-Type"))});
   }
   for (const auto &[header, value] : request.headers) {
-    const std::string name = CgiName(header);
+    std::string name = CgiName(header);
     if (name.empty()) continue;
-    const auto [at, is_new] = variables.try_emplace(name, value);
-    if (!is_new) at->second += (name == "HTTP_COOKIE" ? "; " : ", ") + value;
+    const auto at = std::ranges::find(variables, name, &Variable::name);
+    if (at == variables.end()) {
+      variables.push_back({std::move(name), value});
+    } else {
+      at->value += (name == "HTTP_COOKIE" ? "; " : ", ") + value;
+    }
   }
   return variables;
 }
@@ -62,7 +71,7 @@ std::vector<std::string> CgiEnvironment(const Request &request) {
   std::vector<std::string> environment;
   for (auto &[name, value] : Variables(request)) {
     if (!IsOneLine(value)) continue;
-    environment.push_back(name + "=" + value);
+    environment.push_back(std::move(name.append("=").append(value)));
   }
   return environment;
 }

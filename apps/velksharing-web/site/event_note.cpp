@@ -8,7 +8,6 @@ namespace web {
 namespace {
 
 using VELK::sharing::UID_ERR;
-using VELK::sharing::db::EntryDB;
 using VELK::sharing::db::SessionDB;
 using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
@@ -33,16 +32,16 @@ void NoteAccount(const Entry &entry, const std::string &session_id, AccessNote &
 
 void NoteLogin(const Link &link, const std::string &session_id, AccessNote &note) {
   note.event = link.IsOpen() ? AccessNote::Event::ENTER : AccessNote::Event::LOGIN;
-  note.entry_id = link.entry.get_id();
-  NoteAccount(link.entry, session_id, note);
+  note.entry_id = link.entry->get_id();
+  NoteAccount(*link.entry, session_id, note);
 }
 
 void NoteLogout(const std::string &hash, const std::string &session_id, AccessNote &note) {
-  Entry entry;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash, entry)) return;
+  const EntryPointer entry = FindEntry(hash);
+  if (entry == nullptr) return;
   note.event = AccessNote::Event::LOGOUT;
-  note.entry_id = entry.get_id();
-  NoteAccount(entry, session_id, note);
+  note.entry_id = entry->get_id();
+  NoteAccount(*entry, session_id, note);
 }
 
 }  // namespace web

@@ -13,6 +13,7 @@
 #include "http/percent.h"
 #include "http/wipe.h"
 #include "site/cgi_environment.h"
+#include "site/find_entry.h"
 #include "site/link.h"
 #include "site/session_ids.h"
 #include "site/way_back.h"
@@ -20,8 +21,6 @@
 namespace web {
 namespace {
 
-using VELK::sharing::db::EntryDB;
-using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
 
 constexpr long kUnavailableSeconds = 10;
@@ -65,9 +64,9 @@ Response Opened(const Admitted &admitted, bool is_authorizer) {
 
 /// Whether a link's login page may be shown to anybody.
 bool HasDoor(const std::string &hash) {
-  Entry link;
-  return EntryDB(SharingDB::Instance()).GetByHash(hash, link) &&
-         link.get_protect_type() != Entry::PROTECT_NONE && AdmitsVisitors(link);
+  const EntryPointer link = FindEntry(hash);
+  return link != nullptr && link->get_protect_type() != Entry::PROTECT_NONE &&
+         AdmitsVisitors(*link);
 }
 
 }  // namespace

@@ -69,6 +69,23 @@ bool MakeIndex(SharingDB &db) {
   return db.Execute("PRAGMA cache_size = " + std::to_string(usual), changed_back) && is_made;
 }
 
+/// What a column of the first row says.
+std::optional<std::string> ReadText(const char *sql, const char *column) {
+  Result result;
+  Row row;
+  if (!SharingDB::Instance().Execute(sql, result) || !result.NextRow(row)) return std::nullopt;
+  return row.GetField(column).AsString("");
+}
+
+/// What is the same for as long as nobody writes to the database: neither others, of whose writing
+/// the first part tells, nor this connection.
+std::optional<std::string> ReadMark() {
+  auto others = ReadText("PRAGMA data_version", "data_version");
+  const auto own = ReadText("SELECT total_changes() AS changes", "changes");
+  if (!others || !own) return std::nullopt;
+  return *others + ' ' + *own;
+}
+
 bool ReadSpeakers(Result &rows) {
   SharingDB &db = SharingDB::Instance();
   if (!db.IsGood()) return false;
@@ -82,8 +99,15 @@ Guards::Guards(std::vector<gate::GuardedPrefix> configured) : configured_(std::m
 }
 
 bool Guards::Refresh() {
+  // Read first: what is written meanwhile counts as not known.
+  std::optional<std::string> mark = ReadMark();
+  if (mark && mark == mark_) return true;
+  mark_.reset();
   Result rows;
-  if (ReadSpeakers(rows) && (AreKnown(rows) || ReadAnew())) return true;
+  if (ReadSpeakers(rows) && (AreKnown(rows) || ReadAnew())) {
+    mark_ = std::move(mark);
+    return true;
+  }
   speakers_.clear();
   Rebuild();
   return false;

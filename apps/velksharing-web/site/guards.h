@@ -4,6 +4,7 @@
 #include <velksharing/database.h>
 #include <velksharing/record.h>
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -48,6 +49,8 @@ class Guards {
 
   const std::vector<gate::GuardedPrefix> configured_;
   std::vector<Speaker> speakers_;  ///< By row id.
+  /// Of the database, as it was when they were read; nothing while that is not known.
+  std::optional<std::string> mark_;
   gate::PrefixMap prefixes_;
 };
 

@@ -25,14 +25,14 @@ std::string StoredTarget(const Entry &entry) {
 }
 
 void ReadRedirect(Link &link) {
-  switch (link.entry.get_redirect_type()) {
+  switch (link.entry->get_redirect_type()) {
     case Entry::REDIRECT_NONE:
       break;
     case Entry::REDIRECT_URLPARAM:
-      link.continue_to = StoredTarget(link.entry);
+      link.continue_to = StoredTarget(*link.entry);
       break;
     case Entry::REDIRECT_ALWAYS:
-      link.target = StoredTarget(link.entry);
+      link.target = StoredTarget(*link.entry);
       break;
   }
 }
@@ -45,24 +45,24 @@ std::string SharedPath(const Entry &entry) {
 
 /// Opens what the link shares, where there is anything.
 bool OpenTree(Link &link, const std::vector<std::string> &parts) {
-  const std::string path = SharedPath(link.entry);
+  const std::string path = SharedPath(*link.entry);
   if (path.empty() || path.find('\0') != std::string::npos) return false;
-  link.tree = share::SharedTree::Open(path, link.entry.get_owner_uid(), parts, link.item);
+  link.tree = share::SharedTree::Open(path, link.entry->get_owner_uid(), parts, link.item);
   return link.tree.has_value();
 }
 
 }  // namespace
 
 bool Link::IsOpen() const {
-  return entry.get_protect_type() == Entry::PROTECT_NONE;
+  return entry->get_protect_type() == Entry::PROTECT_NONE;
 }
 
 bool Link::CanDownload() const {
-  const Json::Value hidden = entry.get_app()["hide_download"];
+  const Json::Value hidden = entry->get_app()["hide_download"];
   return !(hidden.isBool() && hidden.asBool());
 }
 
-std::optional<Link> OpenLink(Entry entry, const std::vector<std::string> &parts,
+std::optional<Link> OpenLink(EntryPointer entry, const std::vector<std::string> &parts,
                              std::vector<gate::Prefix> prefixes) {
   Link link;
   link.entry = std::move(entry);

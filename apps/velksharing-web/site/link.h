@@ -9,12 +9,13 @@
 
 #include "gate/prefix.h"
 #include "share/shared_tree.h"
+#include "site/find_entry.h"
 
 namespace web {
 
 /// A link that has something for visitors, with what it has.
 struct Link {
-  VELK::sharing::record::Entry entry;
+  EntryPointer entry;  ///< Never null.
   /// Where visitors are sent as soon as they are in; "" for nowhere.
   std::string target;
   /// Where the page offers to go on; "" for nowhere.
@@ -26,7 +27,7 @@ struct Link {
   /// What was asked for in the tree, where it is there.
   std::optional<share::Item> item;
 
-  bool HasUseLimit() const { return entry.get_expire_times() > 0; }
+  bool HasUseLimit() const { return entry->get_expire_times() > 0; }
   bool IsOpen() const;
   /// Whether files may be taken along, and not only looked at.
   bool CanDownload() const;
@@ -38,8 +39,7 @@ struct Link {
 /// @param prefixes what the link guards, which is enough for a visitor, too.
 /// @return nothing for a link that has nothing to show: its owner is gone, or cannot read what it
 ///         shares.
-std::optional<Link> OpenLink(VELK::sharing::record::Entry entry,
-                             const std::vector<std::string> &parts,
+std::optional<Link> OpenLink(EntryPointer entry, const std::vector<std::string> &parts,
                              std::vector<gate::Prefix> prefixes);
 
 /// Whether a link lets new visitors in now.

@@ -18,8 +18,6 @@ namespace web {
 namespace {
 
 using std::chrono::milliseconds;
-using VELK::sharing::db::EntryDB;
-using VELK::sharing::db::SharingDB;
 using VELK::sharing::record::Entry;
 
 /// How long a link that lets nobody in takes to say so. More than any of the reasons needs, so
@@ -33,7 +31,7 @@ constexpr char kFarewellParameter[] = "logged-out";
 
 /// Whether a check may have failed because the session's account is gone.
 bool MayLackItsAccount(const Link &link) {
-  return link.entry.get_protect_type() == Entry::PROTECT_USER && DatabaseAnswers();
+  return link.entry->get_protect_type() == Entry::PROTECT_USER && DatabaseAnswers();
 }
 
 Result LoginResult(int code) {
@@ -65,7 +63,7 @@ Response LinkVisit::Look(const SharedRequest &wanted) {
   Checked checked = Authorize(hash_, visitor_.session_id());
   const Result &result = Noted(checked.result);
   std::optional<Link> link;
-  if (checked.link) link = OpenLink(std::move(*checked.link), wanted.parts);
+  if (checked.link) link = OpenLink(std::move(checked.link), wanted.parts);
   if (result.code == VELK_SHARING_AUTH_OK)
     return link ? ShowAgain(*link, wanted) : Hidden(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (result.code == VELK_SHARING_AUTH_UNUSABLE && !(link && MayLackItsAccount(*link)))
@@ -76,7 +74,8 @@ Response LinkVisit::Look(const SharedRequest &wanted) {
 Response LinkVisit::LogIn(const Form &form) {
   note_.route = "login";
   const std::optional<Link> link = FindLink();
-  if (!link || !AdmitsVisitors(link->entry)) return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
+  if (!link || !AdmitsVisitors(*link->entry))
+    return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
   if (!visitor_.HasRightForm(form))
     return Entrance(*link, 403, LoginProblem::kFormExpired, Result{});
   Secret session_id;
@@ -101,19 +100,21 @@ Response LinkVisit::LogOut(const Form &form) {
 }
 
 std::optional<Link> LinkVisit::FindLink(const std::vector<std::string> &parts) const {
-  Entry entry;
-  if (!EntryDB(SharingDB::Instance()).GetByHash(hash_, entry)) return std::nullopt;
+  EntryPointer entry = FindEntry(hash_);
+  if (entry == nullptr) return std::nullopt;
   return OpenLink(std::move(entry), parts);
 }
 
-std::optional<Link> LinkVisit::OpenLink(Entry entry, const std::vector<std::string> &parts) const {
+std::optional<Link> LinkVisit::OpenLink(EntryPointer entry,
+                                        const std::vector<std::string> &parts) const {
   std::vector<gate::Prefix> prefixes;
-  if (site_.settings.has_gate) prefixes = site_.guards.PrefixesOf(entry);
+  if (site_.settings.has_gate) prefixes = site_.guards.PrefixesOf(*entry);
   return web::OpenLink(std::move(entry), parts, std::move(prefixes));
 }
 
 Response LinkVisit::LookFromOutside(std::optional<Link> link, const SharedRequest &wanted) {
-  if (!link || !AdmitsVisitors(link->entry)) return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
+  if (!link || !AdmitsVisitors(*link->entry))
+    return Absent(CheckResult(VELK_SHARING_AUTH_NO_GRANT));
   if (wanted.query.Has(kFarewellParameter) && !answers_.wants_json()) return Farewell(*link);
   if (link->IsOpen() && !link->HasUseLimit() && !visitor_.OnlyPeeks())
     return EnterByLooking(*link, wanted);
@@ -135,7 +136,7 @@ Response LinkVisit::EnterByLooking(Link &link, const SharedRequest &wanted) {
 
 Result LinkVisit::LogInOneByOne(const Link &link, const Form &form, std::string &session_id) {
   if (!link.HasUseLimit()) return web::LogIn(hash_, form, link.IsOpen(), session_id);
-  const UseLock lock(site_.settings.runtime_folder, link.entry.get_id(), kLockPatience);
+  const UseLock lock(site_.settings.runtime_folder, link.entry->get_id(), kLockPatience);
   if (!lock.IsHeld()) return LoginResult(VELK_SHARING_LOGIN_UNUSABLE);
   return web::LogIn(hash_, form, link.IsOpen(), session_id);
 }
@@ -194,7 +195,7 @@ Response LinkVisit::RefusedLogin(const Link &link, const Result &result, const F
     case VELK_SHARING_LOGIN_REFUSED: {
       // Nothing was typed; or the link was switched off at this moment.
       const std::optional<Link> now = FindLink();
-      return now && AdmitsVisitors(now->entry) ? AskAgain(*now, result, form) : Absent(result);
+      return now && AdmitsVisitors(*now->entry) ? AskAgain(*now, result, form) : Absent(result);
     }
     case VELK_SHARING_LOGIN_USED_UP:
       return Absent(LoginResult(VELK_SHARING_LOGIN_REFUSED));
@@ -220,7 +221,7 @@ Response LinkVisit::Entrance(const Link &link, int status, LoginProblem problem,
 }
 
 std::string LinkVisit::EntrancePage(const Link &link, const LoginView &view) const {
-  switch (link.entry.get_protect_type()) {
+  switch (link.entry->get_protect_type()) {
     case Entry::PROTECT_PASSWORD:
       return site_.pages.Password(FormReader(), view);
     case Entry::PROTECT_USER:
@@ -263,7 +264,7 @@ WayBack LinkVisit::WayBackFor(const Link &link) const {
 LinkView LinkVisit::ViewOf(const Link &link) const {
   LinkView view;
   view.hash = hash_;
-  view.title = link.entry.get_protect_title();
+  view.title = link.entry->get_protect_title();
   view.can_log_out = !link.IsOpen();
   view.continue_to = link.continue_to;
   return view;

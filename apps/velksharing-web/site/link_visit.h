@@ -52,8 +52,7 @@ class LinkVisit {
  private:
   // The link.
   std::optional<Link> FindLink(const std::vector<std::string> &parts = {}) const;
-  std::optional<Link> OpenLink(VELK::sharing::record::Entry entry,
-                               const std::vector<std::string> &parts) const;
+  std::optional<Link> OpenLink(EntryPointer entry, const std::vector<std::string> &parts) const;
 
   // Ways in, and what is behind.
   Response LookFromOutside(std::optional<Link> link, const SharedRequest &wanted);

@@ -46,7 +46,8 @@ Fields WithoutBrokenFields(const Fields &fields) {
 }  // namespace
 
 void AddSecurityHeaders(Response &response) {
-  response.headers = WithoutBrokenFields(response.headers);
+  if (!std::ranges::all_of(response.headers, FitsAHeader, &Fields::Field::second))
+    response.headers = WithoutBrokenFields(response.headers);
   for (const auto &[name, value] : kOnEveryAnswer) {
     if (response.headers.Find(name) == nullptr)
       response.headers.Add(std::string(name), std::string(value));
