@@ -1,8 +1,6 @@
 #include "server/listening_wait.h"
 
 #include <gtest/gtest.h>
-#include <netinet/in.h>
-#include <sys/socket.h>
 
 #include <atomic>
 #include <chrono>
@@ -11,37 +9,14 @@
 #include <thread>
 #include <vector>
 
+#include "server_listener.h"
+
 namespace {
 
 using std::chrono::milliseconds;
 using web::ListeningWait;
 using web::UniqueFd;
-
-/// A socket that listens on a port of this machine.
-class Listener {
- public:
-  Listener() : socket_(socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0)) {
-    address_.sin_family = AF_INET;
-    address_.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    EXPECT_EQ(0, bind(socket_.get(), reinterpret_cast<sockaddr *>(&address_), sizeof address_));
-    EXPECT_EQ(0, listen(socket_.get(), 8));
-    socklen_t size = sizeof address_;
-    getsockname(socket_.get(), reinterpret_cast<sockaddr *>(&address_), &size);
-  }
-
-  UniqueFd Connect() const {
-    UniqueFd client(socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0));
-    EXPECT_EQ(
-        0, connect(client.get(), reinterpret_cast<const sockaddr *>(&address_), sizeof address_));
-    return client;
-  }
-  UniqueFd Accept() const { return UniqueFd(accept(socket_.get(), nullptr, nullptr)); }
-  int get() const { return socket_.get(); }
-
- private:
-  UniqueFd socket_;
-  sockaddr_in address_ = {};
-};
+using web_test::Listener;
 
 TEST(WebListeningWait, EndsWhenAConnectionIsThere) {
   const Listener listener;

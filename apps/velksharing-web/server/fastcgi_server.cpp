@@ -6,7 +6,6 @@
 
 #include <atomic>
 #include <cerrno>
-#include <mutex>
 #include <stdexcept>
 #include <string_view>
 #include <thread>
@@ -18,7 +17,7 @@
 #include "server/cgi_request.h"
 #include "server/file_offload.h"
 #include "server/limits.h"
-#include "server/listening_wait.h"
+#include "server/reception.h"
 
 namespace web {
 namespace {
@@ -101,12 +100,11 @@ class FastCgiServerPrivate {
   FastCgiServerPrivate(int listening_socket, const Settings &settings, Service &service);
   ~FastCgiServerPrivate();
 
-  void StopAccepting() { wait_.Stop(); }
+  void StopAccepting() { reception_.Stop(); }
 
  private:
   void Serve(std::atomic<int> &connection);
-  bool AcceptNext(Channel &channel);
-  UniqueFd AcceptConnection();
+  bool AcceptNext(Channel &channel, Reception::Clerk &clerk);
   bool AcceptCounted(Channel &channel);
   bool WaitForKept(Channel &channel);
   bool IsStopped() const;
@@ -118,9 +116,7 @@ class FastCgiServerPrivate {
   const FileOffload offload_;
   const AuthQuestions questions_;
   Service &service_;
-  ListeningWait wait_;
-  std::mutex accepting_;
-  std::atomic<int> free_threads_ = 0;          ///< Waiting for new connections.
+  Reception reception_;
   std::vector<std::atomic<int>> connections_;  ///< Of each thread; -1 for none.
   std::vector<std::thread> threads_;
 };
@@ -130,7 +126,7 @@ FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings 
     : offload_(settings),
       questions_(settings),
       service_(service),
-      wait_(listening_socket),
+      reception_(listening_socket),
       connections_(static_cast<size_t>(settings.threads)) {
   if (FCGX_Init() != 0) throw std::runtime_error("FastCGI does not start");
   for (std::atomic<int> &connection : connections_) {
@@ -147,8 +143,9 @@ FastCgiServerPrivate::~FastCgiServerPrivate() {
 
 void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
   Channel channel;
+  Reception::Clerk clerk;
   while (true) {
-    if (AcceptNext(channel)) {
+    if (AcceptNext(channel, clerk)) {
       connection = channel.connection();
       Respond(channel);
       connection = -1;
@@ -158,22 +155,12 @@ void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
   }
 }
 
-bool FastCgiServerPrivate::AcceptNext(Channel &channel) {
+bool FastCgiServerPrivate::AcceptNext(Channel &channel, Reception::Clerk &clerk) {
   if (channel.connection() >= 0) return WaitForKept(channel) && AcceptCounted(channel);
-  UniqueFd connection = AcceptConnection();
+  UniqueFd connection = reception_.Accept(clerk);
   if (!connection.IsOpen()) return false;
   channel.Adopt(std::move(connection));
   return AcceptCounted(channel);
-}
-
-UniqueFd FastCgiServerPrivate::AcceptConnection() {
-  ++free_threads_;
-  // One thread at a time looks at the socket, or a request would wake them all.
-  const std::lock_guard guard(accepting_);
-  const bool is_there = wait_.Wait();
-  --free_threads_;
-  if (!is_there) return UniqueFd();
-  return wait_.Accept(0, nullptr, nullptr);
 }
 
 bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {
@@ -184,14 +171,14 @@ bool FastCgiServerPrivate::AcceptCounted(Channel &channel) {
 }
 
 bool FastCgiServerPrivate::WaitForKept(Channel &channel) {
-  pollfd watched[] = {{wait_.stop_descriptor(), POLLIN, 0}, {channel.connection(), POLLIN, 0}};
+  pollfd watched[] = {{reception_.stop_descriptor(), POLLIN, 0}, {channel.connection(), POLLIN, 0}};
   const int ready = poll(watched, 2, kLookAround);
-  if (ready == 0 && free_threads_ == 0) channel.Cut();
+  if (ready == 0 && reception_.IsEmpty()) channel.Cut();
   return ready > 0 && !IsReady(watched[0]);
 }
 
 bool FastCgiServerPrivate::IsStopped() const {
-  pollfd watched = {wait_.stop_descriptor(), POLLIN, 0};
+  pollfd watched = {reception_.stop_descriptor(), POLLIN, 0};
   return poll(&watched, 1, 0) > 0;
 }
 
