@@ -22,6 +22,21 @@ struct Variable {
   std::string value;
 };
 
+/// Makes one variable of those with the same name, in the order in which they came.
+std::vector<Variable> United(std::vector<Variable> variables) {
+  std::ranges::stable_sort(variables, {}, &Variable::name);
+  std::vector<Variable> united;
+  for (Variable &variable : variables) {
+    if (united.empty() || united.back().name != variable.name) {
+      united.push_back(std::move(variable));
+    } else {
+      const char *const separator = variable.name == "HTTP_COOKIE" ? "; " : ", ";
+      united.back().value.append(separator).append(variable.value);
+    }
+  }
+  return united;
+}
+
 std::vector<Variable> Variables(const Request &request) {
   std::vector<Variable> variables = {
       {"GATEWAY_INTERFACE", "CGI/1.1"},
@@ -36,15 +51,9 @@ std::vector<Variable> Variables(const Request &request) {
   }
   for (const auto &[header, value] : request.headers) {
     std::string name = CgiName(header);
-    if (name.empty()) continue;
-    const auto at = std::ranges::find(variables, name, &Variable::name);
-    if (at == variables.end()) {
-      variables.push_back({std::move(name), value});
-    } else {
-      at->value += (name == "HTTP_COOKIE" ? "; " : ", ") + value;
-    }
+    if (!name.empty()) variables.push_back({std::move(name), value});
   }
-  return variables;
+  return United(std::move(variables));
 }
 
 }  // namespace
