@@ -1,7 +1,6 @@
 #include "record/entry_private.h"
 
 #include <array>
-#include <memory>
 #include <utility>
 
 #include "internal/field_map.h"
@@ -72,10 +71,7 @@ bool EntryPrivate::FromRow(const db::Row &row) {
   use_count_ = row.GetField(SZK_USE_COUNT).AsInt(0);
   auto_gc_ = row.GetField(SZK_AUTO_GC).AsInt(0) != 0;
 
-  const std::shared_ptr<const EntryData> data = ReadEntryData(row.GetField(SZK_DATA).AsString(""));
-  if (data == nullptr) return false;
-  EntryData::operator=(*data);
-  return IsLegal();
+  return ReadEntryData(row.GetField(SZK_DATA).AsString(""), *this) && IsLegal();
 }
 
 }  // namespace VELK::sharing::record

@@ -1,7 +1,10 @@
 #include "record/read_entry_data.h"
 
+#include <algorithm>
 #include <array>
 #include <cstddef>
+#include <functional>
+#include <memory>
 #include <mutex>
 #include <utility>
 
@@ -11,25 +14,42 @@ namespace {
 constexpr std::size_t kTexts = 16;
 constexpr std::size_t kLongestText = 16384;  // bytes; with kTexts it bounds the memory
 
-/// Texts that have been parsed, with what they say; the oldest makes room for the next.
+/// The last few; the oldest makes room for the next.
+template <typename T>
+class Recent {
+ public:
+  /// @return what was forgotten.
+  T Add(T item) {
+    std::swap(items_[oldest_], item);
+    oldest_ = (oldest_ + 1) % items_.size();
+    return item;
+  }
+  const std::array<T, kTexts> &items() const { return items_; }
+
+ private:
+  std::array<T, kTexts> items_{};
+  std::size_t oldest_ = 0;
+};
+
+/// Texts that have come at least twice, with what they say.
 class ParsedTexts {
  public:
   std::shared_ptr<const EntryData> Find(const std::string &text) {
     const std::unique_lock lock(mutex_, std::try_to_lock);
     if (!lock) return nullptr;
-    for (const Parsed &parsed : parsed_) {
+    for (const Parsed &parsed : parsed_.items()) {
       if (parsed.data != nullptr && parsed.text == text) return parsed.data;
     }
     return nullptr;
   }
 
-  void Keep(const std::string &text, std::shared_ptr<const EntryData> data) {
-    if (text.size() > kLongestText) return;
-    Parsed parsed = {text, std::move(data)};  // outside the lock, as is the end of what it replaces
+  /// Takes note of a text that was not found. A list of links, each of which comes once, is not
+  /// kept.
+  void Add(const std::string &text, const EntryData &data) {
+    if (text.size() > kLongestText || !HasComeBefore(text)) return;
+    Parsed parsed = {text, std::make_shared<EntryData>(data)};
     const std::unique_lock lock(mutex_, std::try_to_lock);
-    if (!lock) return;
-    std::swap(parsed_[oldest_], parsed);
-    oldest_ = (oldest_ + 1) % kTexts;
+    if (lock) parsed = parsed_.Add(std::move(parsed));  // which ends after the lock
   }
 
  private:
@@ -38,22 +58,34 @@ class ParsedTexts {
     std::shared_ptr<const EntryData> data;
   };
 
+  bool HasComeBefore(const std::string &text) {
+    const std::size_t hash = std::hash<std::string>()(text);
+    const std::unique_lock lock(mutex_, std::try_to_lock);
+    if (!lock) return false;
+    const auto &once = once_.items();
+    if (std::find(once.begin(), once.end(), hash) != once.end()) return true;
+    once_.Add(hash);
+    return false;
+  }
+
   // Only tried: whoever would have to wait parses instead. So a fork() of a program that has
   // another thread here leaves the child nothing to wait for.
   std::mutex mutex_;
-  std::array<Parsed, kTexts> parsed_;
-  std::size_t oldest_ = 0;
+  Recent<Parsed> parsed_;
+  Recent<std::size_t> once_;  ///< Hashes of texts that have come once.
 };
 
 }  // namespace
 
-std::shared_ptr<const EntryData> ReadEntryData(const std::string &text) {
+bool ReadEntryData(const std::string &text, EntryData &data) {
   static ParsedTexts parsed;
-  if (std::shared_ptr<const EntryData> known = parsed.Find(text)) return known;
-  auto data = std::make_shared<EntryData>();
-  if (!data->Parse(text)) return nullptr;
-  parsed.Keep(text, data);
-  return data;
+  if (const std::shared_ptr<const EntryData> known = parsed.Find(text)) {
+    data = *known;
+    return true;
+  }
+  if (!data.Parse(text)) return false;
+  parsed.Add(text, data);
+  return true;
 }
 
 }  // namespace VELK::sharing::record
