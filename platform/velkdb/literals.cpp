@@ -29,8 +29,9 @@ constexpr std::array kForms = {Form{"SELECT", "WHERE"}, Form{"INSERT", "VALUES"}
                                Form{"UPDATE", "SET"},   Form{"DELETE", "WHERE"},
                                Form{"BEGIN", ""},       Form{"COMMIT", ""}};
 
-/// Other pragmas may act when they are compiled, which would be once. It takes no value.
-constexpr std::string_view kLatePragma = "DATA_VERSION";
+/// The one pragma that is kept compiled. Others may act while they are compiled, which would be
+/// once; this one is read when it is run.
+constexpr std::string_view kKeptPragma = "DATA_VERSION";
 
 /// Keywords behind which columns get names, or expressions are compared with each other.
 constexpr std::array<std::string_view, 8> kDoubtfulWords = {
@@ -61,7 +62,7 @@ class Lifter {
   bool StartStatement() {
     const Token token = lexer_.Next();
     if (token.kind != Token::kWord) return false;
-    if (IsKeyword(token.spelling, "PRAGMA")) return IsKeyword(lexer_.Next().spelling, kLatePragma);
+    if (IsKeyword(token.spelling, "PRAGMA")) return IsKeyword(lexer_.Next().spelling, kKeptPragma);
     const auto *found = std::find_if(kForms.begin(), kForms.end(), [&token](const Form &form) {
       return IsKeyword(token.spelling, form.statement);
     });

@@ -12,7 +12,8 @@ namespace VELK::sharing::record {
 namespace {
 
 constexpr std::size_t kTexts = 16;
-constexpr std::size_t kLongestText = 16384;  // bytes; with kTexts it bounds the memory
+// In bytes. Parsed, a text may take fifty times as much memory.
+constexpr std::size_t kLongestText = 4096;
 
 /// The last few; the oldest makes room for the next.
 template <typename T>
@@ -75,16 +76,24 @@ class ParsedTexts {
   Recent<std::size_t> once_;  ///< Hashes of texts that have come once.
 };
 
+/// Never destroyed: a link may be loaded until the very end.
+ParsedTexts &Texts() {
+  static ParsedTexts &texts = *new ParsedTexts;
+  return texts;
+}
+
+// Made before there are threads: one could fork while another makes it.
+[[maybe_unused]] const ParsedTexts &made_at_start = Texts();
+
 }  // namespace
 
 bool ReadEntryData(const std::string &text, EntryData &data) {
-  static ParsedTexts parsed;
-  if (const std::shared_ptr<const EntryData> known = parsed.Find(text)) {
+  if (const std::shared_ptr<const EntryData> known = Texts().Find(text)) {
     data = *known;
     return true;
   }
   if (!data.Parse(text)) return false;
-  parsed.Add(text, data);
+  Texts().Add(text, data);
   return true;
 }
 

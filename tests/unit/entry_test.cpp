@@ -448,6 +448,26 @@ TEST(Entry, LoadsTheSameDataAnewForEachRecord) {
   }
 }
 
+TEST(Entry, LoadsKnownDataIntoARecordThatHeldOther) {
+  const std::string data = R"({"protect_type":"none","app":{"path":"/a"}})";
+  for (int turn = 0; turn < 4; ++turn) {
+    EntryRecord entry = Full();
+    ASSERT_TRUE(LoadsData(entry, data));
+    EXPECT_EQ(EntryRecord::PROTECT_NONE, entry.get_protect_type());
+    EXPECT_EQ("", entry.get_protect_title());
+    EXPECT_EQ("", entry.get_redirect_uri());
+    EXPECT_THAT(entry.get_protect_uids(), IsEmpty());
+    EXPECT_EQ("/a", entry.get_app()["path"].asString());
+  }
+}
+
+TEST(Entry, RefusesBrokenDataEachTime) {
+  for (int turn = 0; turn < 4; ++turn) {
+    EntryRecord entry;
+    EXPECT_FALSE(LoadsData(entry, R"({"protect_type":"none","app":{},"protect_title":5})"));
+  }
+}
+
 TEST(Entry, LoadsManyDifferentDataMoreThanOnce) {
   const auto title = [](int number) { return "Title " + std::to_string(number % 50); };
   for (int number = 0; number < 150; ++number) {

@@ -2,12 +2,16 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <unistd.h>
 
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
+#include <fstream>
 #include <list>
 #include <mutex>
 #include <stdexcept>
+#include <string>
 #include <thread>
 #include <vector>
 
@@ -26,16 +30,25 @@ class WebReception : public testing::Test {
  protected:
   ~WebReception() override { StopAll(); }
 
-  /// Starts a thread that takes one connection, and returns once it waits for it.
+  /// Starts a thread that takes one connection, and returns once it waits for it, or is done.
   void StartThread(int name) {
     Reception::Clerk &clerk = clerks_.emplace_back();
-    threads_.emplace_back([this, &clerk, name] {
+    std::atomic<pid_t> id = 0;
+    threads_.emplace_back([this, &clerk, &id, name] {
+      id = gettid();
       const UniqueFd connection = reception_.Accept(clerk);
       const std::lock_guard guard(mutex_);
       (connection.IsOpen() ? served_ : unserved_).push_back(name);
       changed_.notify_all();
     });
-    std::this_thread::sleep_for(milliseconds(50));
+    while (id == 0 || Runs(id)) std::this_thread::sleep_for(milliseconds(5));
+  }
+
+  static bool Runs(pid_t thread) {
+    std::ifstream file("/proc/self/task/" + std::to_string(thread) + "/stat");
+    std::string line;
+    std::getline(file, line);
+    return line.find(") R ") != std::string::npos;
   }
 
   /// Makes a connection, and returns once a thread has taken it.

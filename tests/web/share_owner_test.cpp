@@ -151,10 +151,17 @@ TEST_F(ShareOwnerScope, OpensByTheGroupOfAnOwnerWithoutOthers) {
   EXPECT_TRUE(CanOpen(path));
 }
 
-TEST_F(ShareOwnerScope, OpensByNoOtherGroup) {
+TEST_F(ShareOwnerScope, AnOwnerWithoutFurtherGroupsHasNoneOfTheProcess) {
   const std::string path = OfGroup(kSomeGroup);
-  const OwnerScope as_nobody({kNobody, kNobody, {kNobody}});
-  EXPECT_FALSE(CanOpen(path));
+  EXPECT_EQ(RunForked([&] {
+              if (setgroups(1, &kSomeGroup) != 0) return 1;
+              {
+                const OwnerScope as_nobody({kNobody, kNobody, {kNobody}});
+                if (!as_nobody.IsEntered() || CanOpen(path)) return 2;
+              }
+              return CurrentFileRights().groups == std::vector<gid_t>{kSomeGroup} ? 0 : 3;
+            }),
+            0);
 }
 
 TEST_F(ShareOwnerScope, LosesTheGroupsOfTheProcess) {

@@ -50,7 +50,7 @@ size_t PlausibleBytes(std::string_view text, size_t length) {
   return count;
 }
 
-// Of the ASCII characters that it begins with; up to seven fewer, for they are looked at in eights.
+// How many ASCII characters a text begins with, or up to seven fewer: they are looked at in eights.
 size_t AsciiLength(std::string_view text) {
   constexpr uint64_t kBeyondAscii = 0x8080808080808080;
   size_t length = 0;

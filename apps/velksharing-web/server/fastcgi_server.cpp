@@ -103,7 +103,13 @@ class FastCgiServerPrivate {
   void StopAccepting() { reception_.Stop(); }
 
  private:
-  void Serve(std::atomic<int> &connection);
+  /// What a thread works with, and others see.
+  struct Post {
+    std::atomic<int> connection = -1;  ///< That it answers on; -1 for none.
+    Reception::Clerk clerk;
+  };
+
+  void Serve(Post &post);
   bool AcceptNext(Channel &channel, Reception::Clerk &clerk);
   bool AcceptCounted(Channel &channel);
   bool WaitForKept(Channel &channel);
@@ -117,7 +123,7 @@ class FastCgiServerPrivate {
   const AuthQuestions questions_;
   Service &service_;
   Reception reception_;
-  std::vector<std::atomic<int>> connections_;  ///< Of each thread; -1 for none.
+  std::vector<Post> posts_;  ///< Of each thread.
   std::vector<std::thread> threads_;
 };
 
@@ -127,28 +133,24 @@ FastCgiServerPrivate::FastCgiServerPrivate(int listening_socket, const Settings 
       questions_(settings),
       service_(service),
       reception_(listening_socket),
-      connections_(static_cast<size_t>(settings.threads)) {
+      posts_(static_cast<size_t>(settings.threads)) {
   if (FCGX_Init() != 0) throw std::runtime_error("FastCGI does not start");
-  for (std::atomic<int> &connection : connections_) {
-    connection = -1;
-    threads_.emplace_back([this, &connection] { Serve(connection); });
-  }
+  for (Post &post : posts_) threads_.emplace_back([this, &post] { Serve(post); });
 }
 
 FastCgiServerPrivate::~FastCgiServerPrivate() {
   StopAccepting();
-  for (const std::atomic<int> &connection : connections_) shutdown(connection, SHUT_RDWR);
+  for (const Post &post : posts_) shutdown(post.connection, SHUT_RDWR);
   for (std::thread &thread : threads_) thread.join();
 }
 
-void FastCgiServerPrivate::Serve(std::atomic<int> &connection) {
+void FastCgiServerPrivate::Serve(Post &post) {
   Channel channel;
-  Reception::Clerk clerk;
   while (true) {
-    if (AcceptNext(channel, clerk)) {
-      connection = channel.connection();
+    if (AcceptNext(channel, post.clerk)) {
+      post.connection = channel.connection();
       Respond(channel);
-      connection = -1;
+      post.connection = -1;
     } else if (IsStopped()) {
       return;
     }

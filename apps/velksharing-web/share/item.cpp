@@ -7,7 +7,6 @@
 namespace web::share {
 
 std::optional<std::string> ReadStart(const Item &file, size_t limit) {
-  if (static_cast<off_t>(limit) > file.size) limit = static_cast<size_t>(file.size);
   std::string start(limit, '\0');
   size_t filled = 0;
   while (filled < limit) {

@@ -77,8 +77,8 @@ std::optional<std::string> ReadText(const char *sql, const char *column) {
   return row.GetField(column).AsString("");
 }
 
-/// What is the same for as long as nobody writes to the database: neither others, of whose writing
-/// the first part tells, nor this connection.
+/// What is the same for as long as nobody changes a row of the database: neither others, of whose
+/// writing the first part tells, nor this connection.
 std::optional<std::string> ReadMark() {
   auto others = ReadText("PRAGMA data_version", "data_version");
   const auto own = ReadText("SELECT total_changes() AS changes", "changes");
@@ -104,7 +104,7 @@ bool Guards::Refresh() {
   if (mark && mark == mark_) return true;
   mark_.reset();
   Result rows;
-  if (ReadSpeakers(rows) && (AreKnown(rows) || ReadAnew())) {
+  if (mark && ReadSpeakers(rows) && (AreKnown(rows) || ReadAnew())) {
     mark_ = std::move(mark);
     return true;
   }

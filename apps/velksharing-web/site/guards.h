@@ -18,9 +18,9 @@ namespace web {
 /// Which links guard which addresses: those that say so themselves (`app.protects`, an array of
 /// prefixes), and those that the configuration names. Works on the database of this process.
 ///
-/// The links' own word is read from the database at each Refresh(). An index of the database, which
-/// is made at the first, holds the links that have one, and nobody else pays for the others. They
-/// are parsed again when any of them has changed since the last time.
+/// At each Refresh() the database is asked whether anybody has written to it since the last one. If
+/// so, the links' own word is read again, and parsed where it differs. An index of the database,
+/// which is made at the first, holds the links that have one, and nobody pays for the others.
 class Guards {
  public:
   explicit Guards(std::vector<gate::GuardedPrefix> configured);
