@@ -57,38 +57,35 @@ std::optional<std::vector<gate::Prefix>> PrefixesIn(int id, const std::string &d
   return prefixes;
 }
 
-/// Reads every link to make the index, but does not keep them all in memory.
-bool MakeIndex(SharingDB &db) {
-  Result result;
-  Row row;
-  if (!db.Execute("PRAGMA cache_size", result) || !result.NextRow(row)) return false;
-  const int usual = row.GetField("cache_size").AsInt(0);
-  Result changed;
-  Result changed_back;
-  const bool is_made = db.Execute("PRAGMA cache_size = 100", changed) && db.Execute(kIndex);
-  return db.Execute("PRAGMA cache_size = " + std::to_string(usual), changed_back) && is_made;
-}
-
 /// What a column of the first row says.
-std::optional<std::string> ReadText(const char *sql, const char *column) {
+std::optional<std::string> ReadValue(const char *sql, const char *column) {
   Result result;
   Row row;
   if (!SharingDB::Instance().Execute(sql, result) || !result.NextRow(row)) return std::nullopt;
   return row.GetField(column).AsString("");
 }
 
+/// Reads every link to make the index, but does not keep them all in memory.
+bool MakeIndex(SharingDB &db) {
+  const std::optional<std::string> usual = ReadValue("PRAGMA cache_size", "cache_size");
+  if (!usual) return false;
+  Result changed;
+  Result changed_back;
+  const bool is_made = db.Execute("PRAGMA cache_size = 100", changed) && db.Execute(kIndex);
+  return db.Execute("PRAGMA cache_size = " + *usual, changed_back) && is_made;
+}
+
 /// What is the same for as long as nobody changes a row of the database: neither others, of whose
 /// writing the first part tells, nor this connection.
 std::optional<std::string> ReadMark() {
-  auto others = ReadText("PRAGMA data_version", "data_version");
-  const auto own = ReadText("SELECT total_changes() AS changes", "changes");
+  auto others = ReadValue("PRAGMA data_version", "data_version");
+  const auto own = ReadValue("SELECT total_changes() AS changes", "changes");
   if (!others || !own) return std::nullopt;
   return *others + ' ' + *own;
 }
 
 bool ReadSpeakers(Result &rows) {
   SharingDB &db = SharingDB::Instance();
-  if (!db.IsGood()) return false;
   return db.Execute(kSpeakers, rows) || (MakeIndex(db) && db.Execute(kSpeakers, rows));
 }
 
