@@ -167,6 +167,15 @@ TEST(ShareTree, WhatHasADotInFrontIsHidden) {
   EXPECT_FALSE(folder.Has({".git", "config"}));
 }
 
+TEST(ShareTree, WhatTellsOfProcessesIsNotFoundBelowAFolderEither) {
+  const auto tree = SharedTree::Open("/", Sharer());
+  ASSERT_TRUE(tree);
+  EXPECT_TRUE(tree->Find({"usr"}));
+  EXPECT_FALSE(tree->Find({"proc"}));
+  EXPECT_FALSE(tree->Find({"proc", "version"}));
+  EXPECT_FALSE(tree->Find({"proc", "self", "environ"}));
+}
+
 TEST(ShareTree, APipeIsNotFoundAndNotWaitedFor) {
   const SharedFolder folder;
   ASSERT_EQ(mkfifo(folder.File("pipe").c_str(), 0666), 0);
