@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "sqlite.h"
+#include "velk_paths.h"
 
 namespace velk_bench {
 namespace {

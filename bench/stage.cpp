@@ -10,6 +10,7 @@
 #include "dataset.h"
 #include "flush_counter.h"
 #include "team.h"
+#include "velk_paths.h"
 
 namespace velk_bench {
 namespace {

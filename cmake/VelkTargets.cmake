@@ -15,11 +15,12 @@ if(CMAKE_CXX_COMPILER_ID STREQUAL GNU AND CMAKE_CXX_COMPILER_VERSION VERSION_LES
   target_compile_options(velk_flags INTERFACE $<$<COMPILE_LANGUAGE:CXX>:-Wno-restrict>)
 endif()
 
-# Targets that know where things live.
+# Targets that know where things live, by velk_paths.h. A header, so that only the files that include
+# it are compiled anew for another place.
+set(VELK_PATHS_TEMPLATE "${CMAKE_CURRENT_LIST_DIR}/velk_paths.h.in")
+configure_file("${VELK_PATHS_TEMPLATE}" "${PROJECT_BINARY_DIR}/generated/velk_paths.h" @ONLY)
 add_library(velk_paths INTERFACE)
-target_compile_definitions(velk_paths INTERFACE
-  VELK_ROOT="${VELK_ROOT}" VELK_SYSTEM_UID=${VELK_SYSTEM_UID} VELK_SYSTEM_GID=${VELK_SYSTEM_GID}
-  VELK_SASLAUTHD_SOCKET="${VELK_SASLAUTHD_SOCKET}")
+target_include_directories(velk_paths INTERFACE "${PROJECT_BINARY_DIR}/generated")
 
 # velk_shared_library(NAME MAP): what all our shared libraries have in common. The version map
 # decides what leaves the library, and whatever it needs must be named.

@@ -1,5 +1,7 @@
 #include "velksharing/constants.h"
 
+#include "velk_paths.h"
+
 namespace VELK::sharing {
 
 const char *const SZK_ID_ = "id";

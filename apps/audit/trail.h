@@ -1,6 +1,8 @@
 #ifndef AUDIT_TRAIL_H
 #define AUDIT_TRAIL_H
 
+#include "velk_paths.h"
+
 namespace audit {
 
 /// Where velksharing-web keeps the audit trail.

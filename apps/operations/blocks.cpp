@@ -6,6 +6,7 @@
 #include "operations/address.h"
 #include "operations/failure.h"
 #include "velk/velksdk.h"
+#include "velk_paths.h"
 
 namespace operations {
 namespace {

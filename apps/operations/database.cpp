@@ -9,6 +9,7 @@
 #include <filesystem>
 #include <system_error>
 
+#include "velk_paths.h"
 #include "velksharing/constants.h"
 
 namespace operations {

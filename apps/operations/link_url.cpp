@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include "operations/links.h"
+#include "velk_paths.h"
 #include "velksharing/utils.h"
 
 namespace operations {

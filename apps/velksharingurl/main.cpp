@@ -8,6 +8,7 @@
 #include "mistake.h"
 #include "public_url.h"
 #include "settings.h"
+#include "velk_paths.h"
 
 namespace {
 

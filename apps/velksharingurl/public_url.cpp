@@ -4,6 +4,7 @@
 
 #include "host.h"
 #include "mistake.h"
+#include "velk_paths.h"
 
 namespace sharing_url {
 namespace {

@@ -7,6 +7,7 @@
 #include "host.h"
 #include "mistake.h"
 #include "public_url.h"
+#include "velk_paths.h"
 
 namespace sharing_url {
 namespace {

@@ -11,6 +11,7 @@
 #include <string>
 
 #include "secret.h"
+#include "velk_paths.h"
 
 namespace velk {
 namespace {

@@ -11,6 +11,8 @@
 #include <stdexcept>
 #include <string>
 
+#include "velk_paths.h"
+
 namespace velk {
 namespace {
 

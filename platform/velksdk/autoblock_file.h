@@ -4,6 +4,7 @@
 #include <optional>
 
 #include "sqlite.h"
+#include "velk_paths.h"
 
 namespace velk {
 

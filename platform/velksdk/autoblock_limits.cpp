@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "common/config_file.h"
+#include "velk_paths.h"
 
 namespace velk {
 namespace {

@@ -4,6 +4,7 @@
 
 #include "internal/log.h"
 #include "internal/run_as.h"
+#include "velk_paths.h"
 #include "velksharing/constants.h"
 #include "velksharing/database.h"
 

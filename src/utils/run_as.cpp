@@ -2,6 +2,8 @@
 
 #include <cerrno>
 
+#include "velk_paths.h"
+
 namespace VELK::sharing::internal {
 namespace {
 

@@ -1,6 +1,7 @@
 #include "internal/json.h"
 #include "internal/log.h"
 #include "internal/popen.h"
+#include "velk_paths.h"
 #include "velksharing/utils.h"
 
 namespace VELK::sharing {

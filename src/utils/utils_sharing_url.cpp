@@ -2,6 +2,7 @@
 
 #include "internal/log.h"
 #include "internal/popen.h"
+#include "velk_paths.h"
 #include "velksharing/utils.h"
 
 namespace VELK::sharing {

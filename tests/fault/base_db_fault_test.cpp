@@ -9,6 +9,7 @@
 #include "support/log_matcher.h"
 #include "support/raw_database.h"
 #include "support/temp_dir.h"
+#include "velk_paths.h"
 
 namespace {
 

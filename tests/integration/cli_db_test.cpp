@@ -8,6 +8,7 @@
 #include <thread>
 
 #include "integration/cli_support.h"
+#include "support/build_folders.h"
 
 namespace {
 

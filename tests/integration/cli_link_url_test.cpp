@@ -5,6 +5,8 @@
 #include <filesystem>
 
 #include "integration/cli_support.h"
+#include "support/build_folders.h"
+#include "velk_paths.h"
 
 namespace {
 

@@ -1,6 +1,7 @@
 // Where the command line takes passwords from.
 
 #include "integration/cli_support.h"
+#include "support/build_folders.h"
 
 namespace {
 

@@ -9,6 +9,9 @@
 #include <memory>
 #include <stdexcept>
 
+#include "support/build_folders.h"
+#include "velk_paths.h"
+
 namespace velk_test {
 namespace {
 

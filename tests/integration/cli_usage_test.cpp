@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include "integration/cli_support.h"
+#include "support/build_folders.h"
 
 namespace {
 

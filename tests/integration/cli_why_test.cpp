@@ -5,6 +5,7 @@
 #include <ctime>
 
 #include "integration/cli_support.h"
+#include "velk_paths.h"
 
 namespace {
 

@@ -12,6 +12,7 @@
 #include "support/raw_database.h"
 #include "support/temp_dir.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace {
 

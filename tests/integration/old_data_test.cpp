@@ -8,9 +8,11 @@
 #include <filesystem>
 #include <string>
 
+#include "support/build_folders.h"
 #include "support/process.h"
 #include "support/raw_database.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace {
 

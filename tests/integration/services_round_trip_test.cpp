@@ -5,6 +5,7 @@
 #include <filesystem>
 
 #include "integration/cli_support.h"
+#include "velk_paths.h"
 #include "velksharing/constants.h"
 #include "velksharing/store.h"
 #include "velksharing/utils.h"

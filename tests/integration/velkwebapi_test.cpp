@@ -6,6 +6,8 @@
 
 #include <ctime>
 
+#include "velk_paths.h"
+
 namespace {
 
 using testing::AllOf;

@@ -6,6 +6,8 @@
 #include <sstream>
 
 #include "integration/webapi_support.h"
+#include "support/build_folders.h"
+#include "velk_paths.h"
 
 namespace {
 

@@ -4,6 +4,8 @@
 
 #include <memory>
 
+#include "velk_paths.h"
+
 namespace velk_test {
 
 Outcome WebApi::RunWebApi(Arguments arguments, const std::string &input) {

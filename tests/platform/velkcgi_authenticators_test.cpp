@@ -14,6 +14,7 @@
 #include "support/process.h"
 #include "support/temp_dir.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace fs = std::filesystem;
 

@@ -21,6 +21,7 @@
 #include "support/log_capture.h"
 #include "support/velk_root.h"
 #include "velk/velkcgi.h"
+#include "velk_paths.h"
 
 namespace fs = std::filesystem;
 

@@ -15,6 +15,7 @@
 #include <thread>
 #include <vector>
 
+#include "support/build_folders.h"
 #include "support/log_capture.h"
 #include "support/process.h"
 #include "support/raw_database.h"
@@ -22,6 +23,7 @@
 #include "support/velk_root.h"
 #include "velk/velkcgi.h"
 #include "velk/velksdk.h"
+#include "velk_paths.h"
 
 namespace fs = std::filesystem;
 

@@ -4,6 +4,7 @@
 
 #include <stdexcept>
 
+#include "support/build_folders.h"
 #include "support/temp_dir.h"
 
 namespace velk_test {

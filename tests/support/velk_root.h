@@ -4,7 +4,9 @@
 #include <filesystem>
 #include <string>
 
+#include "support/build_folders.h"
 #include "support/temp_dir.h"
+#include "velk_paths.h"
 
 /// The files below VELK_ROOT that tests make and change. Tests that do so lock "velk_root".
 

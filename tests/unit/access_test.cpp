@@ -14,6 +14,7 @@
 #include "support/log_matcher.h"
 #include "support/sample_records.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace {
 

@@ -9,6 +9,7 @@
 #include "support/log_matcher.h"
 #include "support/process.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace {
 

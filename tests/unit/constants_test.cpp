@@ -5,6 +5,8 @@
 #include <utility>
 #include <vector>
 
+#include "velk_paths.h"
+
 namespace {
 
 using namespace VELK::sharing;

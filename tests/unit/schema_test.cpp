@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "support/build_folders.h"
 #include "support/process.h"
 #include "support/raw_database.h"
 #include "support/temp_dir.h"

@@ -10,6 +10,7 @@
 #include "support/log_capture.h"
 #include "support/log_matcher.h"
 #include "support/scripted_program.h"
+#include "velk_paths.h"
 
 namespace {
 

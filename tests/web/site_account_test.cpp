@@ -11,6 +11,7 @@
 #include "site_support.h"
 #include "support/log_capture.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace fs = std::filesystem;
 

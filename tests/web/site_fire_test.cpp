@@ -9,6 +9,7 @@
 #include "support/process.h"
 #include "support/raw_database.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace {
 

@@ -13,6 +13,7 @@
 #include "http/percent.h"
 #include "support/sample_records.h"
 #include "support/velk_root.h"
+#include "velk_paths.h"
 
 namespace fs = std::filesystem;
 

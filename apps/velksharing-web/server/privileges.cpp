@@ -14,6 +14,8 @@
 #include <string>
 #include <system_error>
 
+#include "velk_paths.h"
+
 namespace web {
 namespace {
 

@@ -12,6 +12,7 @@
 #include <system_error>
 
 #include "http/unique_fd.h"
+#include "velk_paths.h"
 
 namespace web {
 namespace {

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "gate/guarded_prefix.h"
+#include "velk_paths.h"
 #include "watch/shortened_address.h"
 
 namespace web {

@@ -16,6 +16,7 @@
 
 #include "common/address.h"
 #include "common/config_file.h"
+#include "velk_paths.h"
 
 namespace web {
 namespace {
