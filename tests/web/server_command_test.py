@@ -123,6 +123,23 @@ class Configuration(FrontEndTest):
         self.assertEqual(outcome.returncode, 3)
         self.assertIn(server.address, outcome.stderr)
 
+    def test_questions_that_cannot_arrive_as_they_are_expected_are_told_at_the_start(self):
+        by_fastcgi = ["--fastcgi", str(self.folder / "socket")]
+        by_http = ["--listen", "127.0.0.1:0"]
+        for words, way, is_told in (
+                (by_http, "parameter", True), (by_fastcgi, "parameter", False),
+                (by_http, "authorizer", True), (by_fastcgi, "authorizer", False),
+                (by_http, "x-forwarded", False), (by_fastcgi, "x-forwarded", True),
+                (by_http, "x-original-url", False), (by_fastcgi, "x-original-url", True),
+                (by_http, "off", False), (by_fastcgi, "off", False)):
+            with self.subTest(words=words, way=way):
+                (self.folder / "messages").unlink(missing_ok=True)
+                server = FrontEnd([*words, "--set", f"auth_address={way}",
+                                   "--set", "trusted_proxy=127.0.0.1"], self.folder)
+                self.addCleanup(server.kill)
+                self.assertEqual("every question gets a no" in server.log.read_text(), is_told)
+                server.stop()
+
     def test_a_folder_that_others_may_write_to_is_not_used_for_locks(self):
         runtime = self.folder / "runtime"
         runtime.mkdir()

@@ -64,6 +64,17 @@ UniqueFd OpenMetricsSocket(const Settings &settings) {
   return socket;
 }
 
+/// A question that comes in another way than the setting says gets a no. That is safe, but nobody
+/// would see why.
+void WarnOfDeafGate(const Settings &settings, Mode mode) {
+  const bool is_http = mode == Mode::EMBEDDED;
+  if (settings.auth_address == AuthAddress::OFF || IsAskedByHttp(settings.auth_address) == is_http)
+    return;
+  syslog(LOG_WARNING,
+         "auth_address is for questions by %s, and this serves %s: every question gets a no",
+         is_http ? "FastCGI" : "HTTP", is_http ? "HTTP" : "FastCGI");
+}
+
 /// What all processes of a server have from the time before they were forked.
 struct Inheritance {
   const Settings &settings;
@@ -137,6 +148,7 @@ int Serve(const Options &options) {
   ShareTurns();
   if (settings.keeps_audit || common.metrics_socket.IsOpen())
     common.watch.emplace(settings.keeps_audit);
+  WarnOfDeafGate(settings, options.mode);
   syslog(LOG_INFO, "%s on %s", options.mode == Mode::FASTCGI ? "FastCGI" : "HTTP",
          AddressOf(common.socket.get()).c_str());
   return SuperviseWork(common, options.mode);

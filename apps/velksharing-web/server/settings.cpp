@@ -290,6 +290,10 @@ Settings ReadSettings(const std::string &file) {
   return settings;
 }
 
+bool IsAskedByHttp(AuthAddress address) {
+  return address == AuthAddress::X_FORWARDED || address == AuthAddress::X_ORIGINAL_URL;
+}
+
 std::chrono::hours AuditRetention(const Settings &settings) {
   return std::chrono::hours(24) * settings.audit_retention;
 }
@@ -299,9 +303,7 @@ void CheckTogether(const Settings &settings) {
     throw ConfigMistake("listen and fastcgi exclude each other");
   if (settings.file_delivery != FileDelivery::COPY && settings.file_folders.empty())
     throw ConfigMistake("file_delivery by the web server needs file_folders");
-  const bool asks_by_http = settings.auth_address == AuthAddress::X_FORWARDED ||
-                            settings.auth_address == AuthAddress::X_ORIGINAL_URL;
-  if (asks_by_http && settings.trusted_proxies.empty())
+  if (IsAskedByHttp(settings.auth_address) && settings.trusted_proxies.empty())
     throw ConfigMistake("auth_address in header fields needs trusted_proxy");
   if (settings.auth_address == AuthAddress::OFF && !settings.guarded.empty())
     throw ConfigMistake("protect needs auth_address");

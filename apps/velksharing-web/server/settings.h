@@ -78,6 +78,9 @@ void Apply(std::string_view key, std::string_view value, Settings &settings);
 /// @throws velk::ConfigMistake naming file, line and key.
 Settings ReadSettings(const std::string &file);
 
+/// Whether the address that a question is about comes by HTTP; if not, it comes by FastCGI.
+bool IsAskedByHttp(AuthAddress address);
+
 /// How long records of the audit trail are kept.
 std::chrono::hours AuditRetention(const Settings &settings);
 
