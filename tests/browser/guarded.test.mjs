@@ -45,6 +45,22 @@ for (const webServer of ["Nginx", "Caddy", "Lighttpd", "Apache"]) {
       await page.context().close();
     });
 
+    it("is left by the page to log out", async () => {
+      const page = await newPage(browser, { javaScriptEnabled: false });
+      await page.goto(site.address + wanted);
+      await page.waitForURL("**/sharing/**");
+      const link = new URL(page.url()).pathname;
+      await submit(page, password);
+      assert.equal(await page.locator("body").innerText(), site.secret);
+      await page.goto(`${site.address}${link}/logout`);
+      await page.getByRole("button", { name: "Log out" }).click();
+      await page.waitForURL("**?logged-out");
+      await page.goto(site.address + wanted);
+      await page.waitForURL("**/sharing/**");
+      assert.equal(await page.getByLabel("Password").count(), 1);
+      await page.context().close();
+    });
+
     it("is closed to the next visitor", async () => {
       const page = await newPage(browser, { javaScriptEnabled: false });
       await page.goto(`${site.address}/another/page`);

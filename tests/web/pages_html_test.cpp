@@ -63,6 +63,7 @@ std::vector<std::string> PagesWith(const Pages &pages, const std::string &text,
                                       pages.Continue(reader, link, "https://example.org/"),
                                       pages.Folder(reader, folder),
                                       pages.Folder(reader, empty),
+                                      pages.Leave(reader, link),
                                       pages.LoggedOut(reader, link)};
   for (const int status : {400, 403, 404, 405, 408, 413, 414, 418, 429, 431, 500, 503, 507}) {
     for (const long seconds : {0L, 30L, 60L, 20000L, 500000L}) {
@@ -445,6 +446,15 @@ TEST(MessagePage, SaysWhenAnotherTryMakesSense) {
 
 TEST(MessagePage, KnowsNothingOfTheVisitor) {
   EXPECT_EQ(Pages({}).Message({"en", "one"}, 404), Pages({}).Message({"en", "two"}, 404));
+}
+
+TEST(LeavePage, HasOneButtonToLogOutAndAWayBack) {
+  const std::string page = Pages({}).Leave(kEnglish, Link());
+  const std::string form =
+      "<form class=\"stack\" method=\"post\" action=\"/sharing/aB3xK9pQ2/logout\">";
+  EXPECT_THAT(page, HasSubstr(form));
+  EXPECT_EQ(page.find("/logout\""), page.rfind("/logout\""));
+  EXPECT_THAT(page, HasSubstr("<a href=\"/sharing/aB3xK9pQ2\">Back</a>"));
 }
 
 TEST(LoggedOutPage, LeadsBackAndOffersNoLogout) {

@@ -94,6 +94,7 @@ class Writer {
     Write("folder-second-page", pages_.Folder(reader_, last));
     Write("file-text", pages_.File(reader_, TextFile()));
     Write("file-binary", pages_.File(reader_, BinaryFile()));
+    Write("leave", pages_.Leave(reader_, link));
     Write("logged-out", pages_.LoggedOut(reader_, link));
     Write("message-404", pages_.Message(reader_, 404));
     Write("message-429", pages_.Message(reader_, 429, 1200));

@@ -395,6 +395,47 @@ TEST_F(SiteGate, APageThatOnlyAnotherSiteGuardsIsNotReturnedToHere) {
   EXPECT_EQ("/here/", LogIn(browser, "/sharing/abc?return=%2Fanywhere").headers.Get("Location"));
 }
 
+TEST_F(SiteGate, WhoIsInCanLogOutOfALinkThatOnlyGuards) {
+  Store(Guarded("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  ASSERT_EQ(204, browser.Ask(kWiki).status);
+  const Response left = browser.Submit("/sharing/abc/logout", velk_test::FieldList{}, kOnWiki);
+  EXPECT_EQ("/sharing/abc?logged-out", left.headers.Get("Location"));
+  EXPECT_EQ(401, browser.Ask(kWiki).status);
+  Response page = browser.Get("/sharing/abc?logged-out", kOnWiki);
+  EXPECT_THAT(BodyOf(page), HasSubstr("You have logged out"));
+}
+
+TEST_F(SiteGate, LookingAtThePageToLogOutDoesNotLogOut) {
+  Store(Guarded("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  Response page = browser.Get("/sharing/abc/logout", kOnWiki);
+  EXPECT_EQ(200, page.status);
+  EXPECT_THAT(BodyOf(page), HasSubstr("You are logged in"));
+  EXPECT_EQ(204, browser.Ask(kWiki).status);
+}
+
+TEST_F(SiteGate, AStrangerAtThePageToLogOutIsAskedForThePassword) {
+  Store(Guarded("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  Response page = browser.Get("/sharing/abc/logout", kOnWiki);
+  EXPECT_THAT(BodyOf(page), HasSubstr("type=\"password\""));
+}
+
+TEST_F(SiteGate, ALinkThatAlsoSharesShowsAFileNamedLikeThePageToLogOut) {
+  Entry entry = WithPassword(FolderLink("abc"));
+  Json::Value app = entry.get_app();
+  app["protects"][0] = "https://wiki.example/wiki";
+  Store(entry.set_app(app));
+  velk_test::WriteFile(Shared("logout"), "a file");
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  Response file = browser.Get("/sharing/abc/logout?view", kOnWiki);
+  EXPECT_EQ("a file", BodyOf(file));
+}
+
 TEST_F(SiteGate, AnotherSitesVisitorIsLedThereByAPage) {
   Store(Guarded("abc", {"https://other.example/"}));
   Browser browser = Visitor();

@@ -198,6 +198,16 @@ std::string Pages::File(const Reader &reader, const FileView &view) const {
                             FileData(view, {private_->addresses, private_->Texts(reader)}));
 }
 
+std::string Pages::Leave(const Reader &reader, const LinkView &link) const {
+  const Catalogue &texts = private_->Texts(reader);
+  Data data;
+  data.set("title", TitleOf(link, texts));
+  data.set("logout", private_->addresses.Logout(link.hash));
+  data.set("back", private_->addresses.Link(link.hash));
+  return private_->Document(reader, {"leave", texts.Text("leave_window"), FromOutside(link), ""},
+                            data);
+}
+
 std::string Pages::LoggedOut(const Reader &reader, const LinkView &link) const {
   Data data;
   data.set("action", private_->addresses.Link(link.hash));

@@ -108,6 +108,8 @@ class Pages {
   std::string Folder(const Reader &reader, const FolderView &view) const;
   std::string File(const Reader &reader, const FileView &view) const;
 
+  /// Asks whether the visitor wants to leave: for a link without pages of its own to log out on.
+  std::string Leave(const Reader &reader, const LinkView &link) const;
   /// Says that the visitor has left the link, and how to get back.
   std::string LoggedOut(const Reader &reader, const LinkView &link) const;
 

@@ -149,6 +149,10 @@ Response LinkVisit::ShowAgain(Link &link, const SharedRequest &wanted) {
 }
 
 Response LinkVisit::Show(Link &link, const SharedRequest &wanted) {
+  // What is shared has a button to leave on each page, and may have a file of this name.
+  const bool has_own_pages = link.tree.has_value();
+  if (wanted.is_logout && !has_own_pages && !link.IsOpen() && !answers_.wants_json())
+    return AskWhetherToLeave(link);
   const std::string target = DestinationOf(link, WayBackFor(link));
   if (!target.empty()) return SendOn(target);
   // A token costs more than a small file.
@@ -166,6 +170,12 @@ Response LinkVisit::SendOn(const std::string &target) {
   Json::Value document = JsonOf(CheckResult(VELK_SHARING_AUTH_OK));
   document["redirect"] = target;
   return answers_.Json(200, document);
+}
+
+Response LinkVisit::AskWhetherToLeave(const Link &link) const {
+  Response response = answers_.Page(200, site_.pages.Leave(FormReader(), ViewOf(link)));
+  visitor_.KeepFormKey(response);
+  return response;
 }
 
 Response LinkVisit::Welcome(const Link &link, const Result &result,

@@ -63,6 +63,7 @@ class LinkVisit {
   /// Takes the link's item.
   Response Show(Link &link, const SharedRequest &wanted);
   Response SendOn(const std::string &target);
+  Response AskWhetherToLeave(const Link &link) const;
   Response Welcome(const Link &link, const Result &result, const std::string &session_id) const;
 
   // Pages for those who are outside.

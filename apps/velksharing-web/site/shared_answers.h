@@ -23,6 +23,7 @@ struct SharedRequest {
   const Form &query;
   std::vector<std::string> parts;  ///< Names below what is shared.
   bool ends_with_slash = false;
+  bool is_logout = false;  ///< Whether it is the address by which visitors leave.
 
   /// Whether the answer is no page of ours, but a file, an image or an archive.
   bool AsksForBytes() const;

@@ -141,7 +141,7 @@ Response SitePrivate::AnswerLink(const Answers &answers, const Request &request,
   if (!IsReading(request)) return AnswerForm(answers, request, route, visit);
   const std::optional<Form> query = Form::Parse(request.query);
   if (!query) return answers.Error(400);
-  return visit.Look({request, *query, route.parts, route.ends_with_slash});
+  return visit.Look({request, *query, route.parts, route.ends_with_slash, route.IsLogout()});
 }
 
 Response SitePrivate::AnswerForm(const Answers &answers, const Request &request, const Route &route,
