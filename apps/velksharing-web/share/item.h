@@ -23,7 +23,7 @@ struct Item {
   UniqueFd file;  ///< Not at a known offset: read with pread().
 };
 
-/// The first bytes of a file.
+/// The first bytes of a file, of those that it had when it was opened.
 /// @return at most `limit`, fewer when the file ends before; nothing when it cannot be read.
 std::optional<std::string> ReadStart(const Item &file, size_t limit);
 
