@@ -424,6 +424,31 @@ TEST_F(SiteGate, AStrangerAtThePageToLogOutIsAskedForThePassword) {
   EXPECT_THAT(BodyOf(page), HasSubstr("type=\"password\""));
 }
 
+TEST_F(SiteGate, ASessionIsEnoughToLogOutWith) {
+  Store(Guarded("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  Browser other = Visitor();
+  other.SetCookie("/sharing/abc", "sharing_sid", browser.CookieFor("/sharing/abc", "sharing_sid"));
+  EXPECT_EQ(303, other.Submit("/sharing/abc/logout", velk_test::FieldList{}, kOnWiki).status);
+  EXPECT_EQ(401, browser.Ask(kWiki).status);
+}
+
+TEST_F(SiteGate, AnOpenLinkHasNothingToLogOutOf) {
+  Store(Guarding("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  EXPECT_EQ("/", browser.Get("/sharing/abc/logout", kOnWiki).headers.Get("Location"));
+}
+
+TEST_F(SiteGate, ProgramsGetNoPageToLogOut) {
+  Store(Guarded("abc", {"https://wiki.example/"}));
+  Browser browser = Visitor();
+  LogIn(browser, "/sharing/abc");
+  const velk_test::HeaderList program = {{"Host", "wiki.example"}, {"Accept", "application/json"}};
+  Response response = browser.Get("/sharing/abc/logout", program);
+  EXPECT_EQ("/", velk_test::JsonOf(response)["redirect"]);
+}
+
 TEST_F(SiteGate, ALinkThatAlsoSharesShowsAFileNamedLikeThePageToLogOut) {
   Entry entry = WithPassword(FolderLink("abc"));
   Json::Value app = entry.get_app();
