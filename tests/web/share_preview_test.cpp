@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <ostream>
 #include <string>
 
@@ -115,6 +116,16 @@ TEST(SharePreview, ALongTextIsCut) {
   ASSERT_TRUE(start);
   EXPECT_EQ(start->text, "1234");
   EXPECT_TRUE(start->is_cut);
+}
+
+TEST(SharePreview, OfATextThatHasBecomeShorterWhatIsLeftIsRead) {
+  const SharedFolder folder;
+  folder.AddFile("a.txt", "one\ntwo\n");
+  const auto file = folder.Find({"a.txt"});
+  std::filesystem::resize_file(folder.File("a.txt"), 4);
+  const auto start = ReadText(file, 100);
+  ASSERT_TRUE(start);
+  EXPECT_EQ(start->text, "one\n");
 }
 
 TEST(SharePreview, NoCharacterIsCutInTwo) {
